@@ -18,7 +18,7 @@ struct Failure
     juce::String message;
 };
 
-// Four seconds of decaying noise bursts and clicks, one hit every 0.5 s: each echo
+// Four seconds of short decaying noise bursts, one hit a second: each echo
 // stands out clearly between the hits.
 juce::AudioBuffer<float> makeTestSignal (double sampleRate)
 {
