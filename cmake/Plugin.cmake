@@ -37,6 +37,9 @@ target_compile_definitions (Veltrane PUBLIC
     # The effect record's version field: JUCE's decimal form of 1.2.1.
     JucePlugin_VSTChunkStructureVersion=121)
 
+# VST3 parameter IDs are the indices 0..32, as in every other format.
+target_compile_definitions (Veltrane_VST3 PRIVATE JUCE_FORCE_USE_LEGACY_PARAM_IDS=1)
+
 target_link_libraries (Veltrane
     PRIVATE
         juce::juce_audio_utils

@@ -6,7 +6,10 @@ namespace veltrane
 {
 
 HostParameter::HostParameter (VeltraneAudioProcessor& owner, int parameterIndex)
-    : processor (owner), index (parameterIndex)
+    : juce::AudioProcessorParameterWithID (juce::ParameterID (parameterTable[(size_t) parameterIndex].identifier, 1),
+                                           parameterTable[(size_t) parameterIndex].identifier),
+      processor (owner),
+      index (parameterIndex)
 {
 }
 

@@ -10,7 +10,11 @@ class VeltraneAudioProcessor;
 // What the host sees of one parameter: name, text, default, steps and value all
 // come from the processor's record at the same index. The text already ends in
 // the unit ("120.00 Ms"), so the separate unit label stays empty.
-class HostParameter final : public juce::AudioProcessorParameter
+//
+// The identifier doubles as the parameter ID, which names the parameter in LV2
+// (JUCE would otherwise derive LV2 names from the index and give ten parameters the
+// same one). VST2 and VST3 address parameters by index.
+class HostParameter final : public juce::AudioProcessorParameterWithID
 {
 public:
     HostParameter (VeltraneAudioProcessor& owner, int index);
