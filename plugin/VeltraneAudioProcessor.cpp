@@ -1,6 +1,7 @@
 #include "VeltraneAudioProcessor.h"
 
 #include "HostParameter.h"
+#include "../editor/VeltraneAudioProcessorEditor.h"
 
 namespace veltrane
 {
@@ -62,7 +63,7 @@ const juce::String VeltraneAudioProcessor::getOutputChannelName (int channelInde
 
 juce::AudioProcessorEditor* VeltraneAudioProcessor::createEditor()
 {
-    return new juce::GenericAudioProcessorEditor (*this);
+    return new VeltraneAudioProcessorEditor (*this);
 }
 
 const juce::String VeltraneAudioProcessor::getParameterName (int index)
