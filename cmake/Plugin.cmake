@@ -25,7 +25,11 @@ target_sources (Veltrane PRIVATE
     plugin/HostParameter.cpp
     plugin/VeltraneAudioProcessor.cpp
     dsp/ProcessorBlock.cpp
-    persistence/ProcessorPersistence.cpp)
+    persistence/Preferences.cpp
+    persistence/PresetLibrary.cpp
+    persistence/ProcessorPersistence.cpp
+    persistence/SafeXml.cpp
+    persistence/StateChunk.cpp)
 
 target_include_directories (Veltrane PUBLIC "${PROJECT_SOURCE_DIR}")
 

@@ -17,9 +17,14 @@ VeltraneAudioProcessor::VeltraneAudioProcessor()
 
     for (int i = 0; i < Param::count; ++i)
         addParameter (new HostParameter (*this, i));
+
+    openPersistentState();
 }
 
-VeltraneAudioProcessor::~VeltraneAudioProcessor() = default;
+VeltraneAudioProcessor::~VeltraneAudioProcessor()
+{
+    closePersistentState();
+}
 
 const juce::String VeltraneAudioProcessor::getName() const
 {
@@ -142,10 +147,7 @@ void VeltraneAudioProcessor::randomize()
 void VeltraneAudioProcessor::serveBlockStartRequests()
 {
     if (presetLoadPending.load())
-    {
         loadRequestedPreset();
-        presetLoadPending.store (false);
-    }
 
     if (midiClearPending.load())
     {
