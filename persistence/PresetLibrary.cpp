@@ -156,9 +156,19 @@ void PresetLibrary::rescan()
     if (presetFolder.isEmpty())
         return;
 
+    // JUCE matches the wildcard ignoring case even where file names have case; such
+    // a file ("b.VTP") could never be opened by the path built from its name, so
+    // there only the exact extension counts.
+    const auto exactCase = juce::File::areFileNamesCaseSensitive();
+
     for (const auto& entry : juce::RangedDirectoryIterator (juce::File (presetFolder), false,
                                                             "*." + extension, juce::File::findFiles))
-        presetNames.add (entry.getFile().getFileNameWithoutExtension());
+    {
+        const auto file = entry.getFile();
+
+        if (! exactCase || file.getFileName().endsWith ("." + extension))
+            presetNames.add (file.getFileNameWithoutExtension());
+    }
 }
 
 juce::String PresetLibrary::getPresetPath (int index) const
