@@ -44,8 +44,11 @@ bool writePresetFile (const juce::File& target, const juce::String& presetName, 
 
 std::optional<PresetContents> readPresetText (const juce::String& text)
 {
-    const auto element = parseDocument (text);
+    return readPresetDocument (parseDocument (text));
+}
 
+std::optional<PresetContents> readPresetDocument (std::unique_ptr<juce::XmlElement> element)
+{
     if (element == nullptr || ! element->getTagName().equalsIgnoreCase (presetTag))
         return {};
 
@@ -90,8 +93,7 @@ std::optional<PresetContents> readPresetFile (const juce::File& file)
     if (bytes.getSize() > (size_t) maxDocumentBytes)
         return {};
 
-    bytes.append ("", 1);
-    return readPresetText (juce::String (juce::CharPointer_UTF8 (static_cast<const char*> (bytes.getData()))));
+    return readPresetDocument (parseDocument (static_cast<const char*> (bytes.getData()), bytes.getSize()));
 }
 
 void PresetLibrary::chooseRoot (juce::SystemStats::OperatingSystemType system)

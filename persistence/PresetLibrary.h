@@ -27,6 +27,7 @@ bool writePresetFile (const juce::File& target, const juce::String& presetName, 
 // maxDocumentBytes, text that is not XML or another root tag.
 std::optional<PresetContents> readPresetFile (const juce::File& file);
 std::optional<PresetContents> readPresetText (const juce::String& text);
+std::optional<PresetContents> readPresetDocument (std::unique_ptr<juce::XmlElement> element);
 
 // The per-user folder of preset files and the names found in it. Plain object; the
 // processor guards the list against its threads.

@@ -25,6 +25,12 @@ constexpr int maxAttributes = 1024;
 // entities recursively, so those documents are refused before it runs. Any thread.
 std::unique_ptr<juce::XmlElement> parseDocument (const juce::String& text);
 
+// The document element of numBytes bytes of UTF-8 text (ending early at a zero
+// byte), or null when parseDocument refuses it or the bytes are not strictly valid
+// UTF-8: JUCE's decoder steps past the end of the text on a malformed sequence and
+// miscounts an overlong zero.
+std::unique_ptr<juce::XmlElement> parseDocument (const char* utf8, size_t numBytes);
+
 // For each of names, the value of the first attribute of element whose name equals
 // it ignoring the case of letters, or null when there is none.
 std::vector<const juce::String*> findAttributes (const juce::XmlElement& element, const juce::StringArray& names);

@@ -89,11 +89,7 @@ std::optional<StateContents> readStateChunk (const void* data, int sizeInBytes)
     if (textBytes > maxDocumentBytes)
         return {};
 
-    // Decoded from a zero-terminated copy: JUCE's decoder may read past the end of a
-    // malformed sequence, and the clipped text has no terminator of its own.
-    juce::MemoryBlock text (bytes + headerBytes, (size_t) textBytes);
-    text.append ("", 1);
-    const auto element = parseDocument (juce::String (juce::CharPointer_UTF8 (static_cast<const char*> (text.getData()))));
+    const auto element = parseDocument (bytes + headerBytes, (size_t) textBytes);
 
     if (element == nullptr || ! element->getTagName().equalsIgnoreCase (stateTag))
         return {};

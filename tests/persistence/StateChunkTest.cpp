@@ -94,7 +94,19 @@ TEST (StateChunk, MalformedBlocksChangeNothing)
     const auto wrongMagic = [&] { auto block = wrapState (valid); static_cast<char*> (block.getData())[3] = '?'; return block; }();
     const auto eightBytes = [&] { auto block = wrapState (valid); block.setSize (8); return block; }();
 
+    // Raw bytes that are not UTF-8: a bad lead byte before the end, an overlong zero.
+    const auto rawState = [] (const char* text, size_t size) {
+        juce::MemoryBlock block ("VC2!", 4);
+        const auto length = juce::ByteOrder::swapIfBigEndian ((juce::uint32) size);
+        block.append (&length, 4);
+        block.append (text, size);
+        return block;
+    };
+
     const struct { const char* what; juce::MemoryBlock block; } cases[] = {
+        { "bad UTF-8 lead byte", rawState ("<VELTRANE_STATE PresetName=\"\xfe\x05", 30) },
+        { "cut-off character reference", wrapState ("<VELTRANE_STATE PresetName=\"&#x41") },
+        { "overlong zero", rawState ("<VELTRANE_STATE PresetName=\"\xc0\x80\"/>", 33) },
         { "empty", {} },
         { "eight bytes", eightBytes },
         { "wrong magic", wrongMagic },
