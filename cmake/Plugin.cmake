@@ -25,7 +25,11 @@ target_sources (Veltrane PRIVATE
     plugin/HostParameter.cpp
     plugin/VeltraneAudioProcessor.cpp
     dsp/ProcessorBlock.cpp
+    persistence/Preferences.cpp
+    persistence/PresetLibrary.cpp
     persistence/ProcessorPersistence.cpp
+    persistence/SafeXml.cpp
+    persistence/StateChunk.cpp
     editor/PanelLayout.cpp
     editor/DelayComponent.cpp
     editor/LfoComponent.cpp

@@ -18,9 +18,14 @@ VeltraneAudioProcessor::VeltraneAudioProcessor()
 
     for (int i = 0; i < Param::count; ++i)
         addParameter (new HostParameter (*this, i));
+
+    openPersistentState();
 }
 
-VeltraneAudioProcessor::~VeltraneAudioProcessor() = default;
+VeltraneAudioProcessor::~VeltraneAudioProcessor()
+{
+    closePersistentState();
+}
 
 const juce::String VeltraneAudioProcessor::getName() const
 {
@@ -143,10 +148,7 @@ void VeltraneAudioProcessor::randomize()
 void VeltraneAudioProcessor::serveBlockStartRequests()
 {
     if (presetLoadPending.load())
-    {
         loadRequestedPreset();
-        presetLoadPending.store (false);
-    }
 
     if (midiClearPending.load())
     {
