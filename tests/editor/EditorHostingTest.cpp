@@ -1,7 +1,7 @@
 // The editor of the shipped VST2 binary opened and closed in a window through JUCE's
 // plug-in hosting, as a host does. Needs a display (run under Xvfb).
 
-#include <juce_audio_processors/juce_audio_processors.h>
+#include "host/HostTestSupport.h"
 
 #include <gtest/gtest.h>
 
@@ -10,27 +10,11 @@ namespace veltrane::test
 void internWindowManagerAtoms();
 }
 
-namespace
-{
-std::unique_ptr<juce::AudioPluginInstance> loadVst2()
-{
-    juce::VSTPluginFormat format;
-    juce::OwnedArray<juce::PluginDescription> descriptions;
-    format.findAllTypesForFile (descriptions, VELTRANE_VST2_BINARY);
-
-    if (descriptions.isEmpty())
-        return nullptr;
-
-    juce::String error;
-    return format.createInstanceFromDescription (*descriptions[0], 44100.0, 512, error);
-}
-}
-
 TEST (EditorHosting, OpensAndClosesTheVst2EditorRepeatedly)
 {
     veltrane::test::internWindowManagerAtoms();
 
-    auto plugin = loadVst2();
+    auto plugin = veltrane::test::loadPlugin (veltrane::test::Format::vst2);
     ASSERT_NE (plugin, nullptr);
     ASSERT_TRUE (plugin->hasEditor());
     plugin->prepareToPlay (44100.0, 512);

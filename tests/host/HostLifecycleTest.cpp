@@ -2,7 +2,7 @@
 // plug-in: many instances, rate and block-size changes, odd transports, MIDI of
 // every kind. Nothing may crash and the output must stay finite and bounded.
 
-#include <juce_audio_processors/juce_audio_processors.h>
+#include "HostTestSupport.h"
 
 #include <gtest/gtest.h>
 
@@ -10,17 +10,9 @@
 
 namespace
 {
-std::unique_ptr<juce::AudioPluginInstance> loadVst2 (double sampleRate = 44100.0, int blockSize = 512)
+std::unique_ptr<juce::AudioPluginInstance> loadVst2()
 {
-    juce::VSTPluginFormat format;
-    juce::OwnedArray<juce::PluginDescription> descriptions;
-    format.findAllTypesForFile (descriptions, VELTRANE_VST2_BINARY);
-
-    if (descriptions.isEmpty())
-        return nullptr;
-
-    juce::String error;
-    return format.createInstanceFromDescription (*descriptions[0], sampleRate, blockSize, error);
+    return veltrane::test::loadPlugin (veltrane::test::Format::vst2);
 }
 
 // A transport that reports what a test asks for: nothing, a position without a

@@ -1,7 +1,7 @@
 // The shipped LV2 bundle through lilv, the library most Linux LV2 hosts use: it is
 // found under its URI, instantiated with the features it requires and run on audio.
 
-#include "StateChunkFixture.h"
+#include "HostTestSupport.h"
 
 #include <lilv/lilv.h>
 #include <lv2/atom/atom.h>

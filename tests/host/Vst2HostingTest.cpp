@@ -1,28 +1,13 @@
 // The shipped VST2 binary and VST3 bundle loaded through JUCE's own plug-in hosting.
 
-#include <juce_audio_processors/juce_audio_processors.h>
+#include "HostTestSupport.h"
 
 #include <gtest/gtest.h>
 
-namespace Vst2
-{
-#include <pluginterfaces/vst2.x/aeffectx.h>
-}
+using namespace veltrane::test;
 
 namespace
 {
-std::unique_ptr<juce::AudioPluginInstance> loadPlugin (juce::AudioPluginFormat& format, const juce::String& path)
-{
-    juce::OwnedArray<juce::PluginDescription> descriptions;
-    format.findAllTypesForFile (descriptions, path);
-
-    if (descriptions.isEmpty())
-        return nullptr;
-
-    juce::String error;
-    return format.createInstanceFromDescription (*descriptions[0], 44100.0, 512, error);
-}
-
 juce::AudioProcessor::BusesLayout layoutOf (int inputs, int outputs)
 {
     juce::AudioProcessor::BusesLayout layout;
@@ -34,7 +19,7 @@ juce::AudioProcessor::BusesLayout layoutOf (int inputs, int outputs)
 // What the loaded effect answers to effSetSpeakerArrangement.
 juce::pointer_sized_int askArrangement (juce::AudioPluginInstance& plugin, int inputs, int outputs)
 {
-    auto* effect = static_cast<Vst2::AEffect*> (plugin.getPlatformSpecificData());
+    auto* effect = effectOf (plugin);
     Vst2::VstSpeakerArrangement in {}, out {};
     in.type = inputs == 1 ? Vst2::kSpeakerArrMono : Vst2::kSpeakerArrStereo;
     in.numChannels = inputs;
@@ -59,8 +44,7 @@ void expectIdentity (juce::AudioPluginInstance& plugin)
 
 TEST (Vst2Hosting, ReportsIdentityParametersAndLayouts)
 {
-    juce::VSTPluginFormat format;
-    auto plugin = loadPlugin (format, VELTRANE_VST2_BINARY);
+    auto plugin = loadPlugin (Format::vst2);
     ASSERT_NE (plugin, nullptr);
 
     expectIdentity (*plugin);
@@ -90,8 +74,7 @@ TEST (Vst2Hosting, ReportsIdentityParametersAndLayouts)
 
 TEST (Vst2Hosting, ProcessesAudioInPlace)
 {
-    juce::VSTPluginFormat format;
-    auto plugin = loadPlugin (format, VELTRANE_VST2_BINARY);
+    auto plugin = loadPlugin (Format::vst2);
     ASSERT_NE (plugin, nullptr);
 
     plugin->prepareToPlay (44100.0, 512);
@@ -114,8 +97,7 @@ TEST (Vst2Hosting, ProcessesAudioInPlace)
 
 TEST (Vst3Hosting, LoadsTheBundleWithTheSameIdentity)
 {
-    juce::VST3PluginFormat format;
-    auto plugin = loadPlugin (format, VELTRANE_VST3_BUNDLE);
+    auto plugin = loadPlugin (Format::vst3);
     ASSERT_NE (plugin, nullptr);
 
     expectIdentity (*plugin);
@@ -127,45 +109,19 @@ TEST (Vst3Hosting, LoadsTheBundleWithTheSameIdentity)
     EXPECT_EQ (parameters[32]->getName (64), "LFO2SyncedRate");
 }
 
-namespace
-{
-// The effect's own chunk (effGetChunk), without JUCE's bank wrapping around it.
-juce::MemoryBlock effectChunk (juce::AudioPluginInstance& plugin)
-{
-    auto* effect = static_cast<Vst2::AEffect*> (plugin.getPlatformSpecificData());
-    void* data = nullptr;
-    const auto size = effect->dispatcher (effect, Vst2::effGetChunk, 0, 0, &data, 0.0f);
-    return size > 0 && data != nullptr ? juce::MemoryBlock (data, (size_t) size) : juce::MemoryBlock();
-}
-
-void setEffectChunk (juce::AudioPluginInstance& plugin, const juce::String& text)
-{
-    juce::MemoryBlock chunk;
-    chunk.append ("VC2!", 4);
-    const auto length = juce::ByteOrder::swapIfBigEndian ((juce::uint32) text.getNumBytesAsUTF8());
-    chunk.append (&length, 4);
-    chunk.append (text.toRawUTF8(), text.getNumBytesAsUTF8());
-    chunk.append ("", 1);
-
-    auto* effect = static_cast<Vst2::AEffect*> (plugin.getPlatformSpecificData());
-    effect->dispatcher (effect, Vst2::effSetChunk, 0, (juce::pointer_sized_int) chunk.getSize(), chunk.getData(), 0.0f);
-}
-}
-
 TEST (Vst2Hosting, SavedStateRestoresValuesBindingsAndPresetName)
 {
-    juce::VSTPluginFormat format;
-    auto original = loadPlugin (format, VELTRANE_VST2_BINARY);
+    auto original = loadPlugin (Format::vst2);
     ASSERT_NE (original, nullptr);
 
     // Bindings and a name reach the effect through a chunk; values through the host.
-    setEffectChunk (*original, "<VELTRANE_STATE PresetName=\"Wide &amp; &quot;dark&quot;\" Delay1TimeCC=\"74\" LFO2SyncedRateCC=\"1\"/>");
+    setChunk (Format::vst2, *original, wrapStateText ("<VELTRANE_STATE PresetName=\"Wide &amp; &quot;dark&quot;\" Delay1TimeCC=\"74\" LFO2SyncedRateCC=\"1\"/>"));
     const auto& parameters = original->getParameters();
     ASSERT_EQ (parameters.size(), 33);
     for (int i = 0; i < parameters.size(); ++i)
         parameters[i]->setValue ((float) (i + 1) / 37.0f);
 
-    const auto expected = effectChunk (*original);
+    const auto expected = getChunk (Format::vst2, *original);
     const auto text = juce::String::fromUTF8 (static_cast<const char*> (expected.getData()) + 8, (int) expected.getSize() - 9);
     EXPECT_TRUE (text.contains ("PresetName=\"Wide &amp; &quot;dark&quot;\"")) << text;
     EXPECT_TRUE (text.contains ("Delay1TimeCC=\"74\"")) << text;
@@ -173,11 +129,11 @@ TEST (Vst2Hosting, SavedStateRestoresValuesBindingsAndPresetName)
     juce::MemoryBlock hostState;
     original->getStateInformation (hostState);
 
-    auto restored = loadPlugin (format, VELTRANE_VST2_BINARY);
+    auto restored = loadPlugin (Format::vst2);
     ASSERT_NE (restored, nullptr);
     restored->setStateInformation (hostState.getData(), (int) hostState.getSize());
 
-    EXPECT_EQ (effectChunk (*restored), expected);
+    EXPECT_EQ (getChunk (Format::vst2, *restored), expected);
     for (int i = 0; i < parameters.size(); ++i)
         EXPECT_EQ (restored->getParameters()[i]->getValue(), (float) (i + 1) / 37.0f) << i;
 }
