@@ -2,9 +2,11 @@
 // found under its URI, instantiated with the features it requires and run on audio.
 
 #include "HostTestSupport.h"
+#include "support/TemporaryHome.h"
 
 #include <lilv/lilv.h>
 #include <lv2/atom/atom.h>
+#include <lv2/atom/util.h>
 #include <lv2/buf-size/buf-size.h>
 #include <lv2/options/options.h>
 #include <lv2/state/state.h>
@@ -119,8 +121,9 @@ protected:
         }
     }
 
-    // Empty event sequences in, room for events out, as a host prepares them per block.
-    void prepareAtomPorts()
+    // Event sequences in (empty, or with the given MIDI messages), room for events
+    // out, as a host prepares them per block.
+    void prepareAtomPorts (const std::vector<std::pair<int64_t, std::vector<uint8_t>>>& midi = {})
     {
         const auto sequenceType = UridMap::map (&urids, LV2_ATOM__Sequence);
         const auto chunkType = UridMap::map (&urids, LV2_ATOM__Chunk);
@@ -132,6 +135,16 @@ protected:
             sequence->atom.type = sequenceType;
             sequence->body.unit = 0;
             sequence->body.pad = 0;
+
+            for (const auto& [frame, bytes] : midi)
+            {
+                auto* event = reinterpret_cast<LV2_Atom_Event*> (reinterpret_cast<char*> (&sequence->body) + sequence->atom.size);
+                event->time.frames = frame;
+                event->body.size = (uint32_t) bytes.size();
+                event->body.type = UridMap::map (&urids, "http://lv2plug.in/ns/ext/midi#MidiEvent");
+                std::copy (bytes.begin(), bytes.end(), reinterpret_cast<uint8_t*> (event + 1));
+                sequence->atom.size += (uint32_t) lv2_atom_pad_size (sizeof (LV2_Atom_Event) + bytes.size());
+            }
         }
 
         for (auto i : atomOutputs)
@@ -272,4 +285,48 @@ TEST_F (Lv2Host, StateChunkRestoresThroughTheStateInterface)
     const auto chunk = StateChunkFixture::makeChunk (identifiers);
     restoreChunk (chunk);
     EXPECT_EQ (saveChunk(), chunk);
+}
+
+TEST_F (Lv2Host, MidiReachesLearnedControllersAndProgramChanges)
+{
+    using namespace veltrane::test;
+    const TemporaryHome home;
+
+    // A preset the program change can select, in the folder a new instance scans.
+    const auto folder = juce::File::getSpecialLocation (juce::File::userHomeDirectory)
+                            .getChildFile (".Tarnwell_Audio/Presets/Veltrane");
+    ASSERT_TRUE (folder.createDirectory());
+    ASSERT_TRUE (folder.getChildFile ("Quiet.vtp").replaceWithText (
+        "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<VELTRANE_PRESET PresetName=\"Quiet\" WaveshaperAmount=\"0.75\"/>\n"));
+
+    instantiate();
+    lilv_instance_activate (instance);
+
+    const auto fresh = parseStateChunk (saveChunk());
+    ASSERT_NE (fresh, nullptr);
+    juce::StringArray identifiers;
+    juce::Array<float> defaults;
+    for (int i = 0; i < fresh->getNumAttributes(); ++i)
+        if (const auto name = fresh->getAttributeName (i); name != "PresetName" && ! name.endsWith ("CC"))
+        {
+            identifiers.add (name);
+            defaults.add ((float) fresh->getDoubleAttribute (name));
+        }
+    restoreChunk (StateChunkFixture::makeChunk (identifiers, {}, { { "DryWet", 74 } }, "Init", defaults));
+
+    const auto runWith = [this] (std::vector<std::pair<int64_t, std::vector<uint8_t>>> midi) {
+        prepareAtomPorts (midi);
+        lilv_instance_run (instance, blockSize);
+    };
+
+    runWith ({ { 10, { 0xb4, 74, 32 } }, { 20, { 0xc0, 0 } } });   // CC 74 on channel 5, program 0
+    runWith ({});
+    lilv_instance_deactivate (instance);
+
+    const auto state = parseStateChunk (saveChunk());
+    ASSERT_NE (state, nullptr);
+    EXPECT_FLOAT_EQ ((float) state->getDoubleAttribute ("DryWet"), 32.0f / 127.0f);
+    EXPECT_EQ (state->getIntAttribute ("DryWetCC"), 74);
+    EXPECT_EQ (state->getStringAttribute ("PresetName"), "Quiet");
+    EXPECT_EQ (state->getDoubleAttribute ("WaveshaperAmount"), 0.75);
 }
