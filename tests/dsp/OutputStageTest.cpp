@@ -1,0 +1,59 @@
+#include "dsp/OutputStage.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+
+using veltrane::OutputStage;
+
+TEST (OutputStage, SoftClipperIsTheCubic)
+{
+    EXPECT_NEAR (OutputStage::softClip (1.0f), 0.833333f, 1e-6);
+    EXPECT_NEAR (OutputStage::softClip (std::sqrt (2.0f)), 0.942809f, 1e-6);
+    EXPECT_NEAR (OutputStage::softClip (-std::sqrt (2.0f)), -0.942809f, 1e-6);
+    EXPECT_NEAR (OutputStage::softClip (std::sqrt (6.0f)), 0.0f, 1e-6);
+    EXPECT_FLOAT_EQ (OutputStage::softClip (3.0f), -1.5f);
+}
+
+TEST (OutputStage, HardClipperDriveRunsFromOneToTen)
+{
+    EXPECT_NEAR (OutputStage::hardClip (1.0f, OutputStage::hardClipDrive (0.0f)), 0.761594f, 1e-6);
+    EXPECT_NEAR (OutputStage::hardClip (0.1f, OutputStage::hardClipDrive (1.0f)), 0.761594f, 1e-6);
+    EXPECT_NEAR (OutputStage::hardClip (-0.1f, OutputStage::hardClipDrive (1.0f)), -0.761594f, 1e-6);
+}
+
+TEST (OutputStage, DirtNeverExceedsTanhOfSinOfOne)
+{
+    EXPECT_NEAR (OutputStage::dirt (0.1f, OutputStage::dirtDrive (0.0f)), 0.571426f, 1e-6);
+
+    for (auto v : { 100.0f, 1.0e6f, 1.0e15f })
+    {
+        EXPECT_NEAR (OutputStage::dirt (v, OutputStage::dirtDrive (0.0f)), 0.686587f, 1e-5) << v;
+        EXPECT_NEAR (OutputStage::dirt (-v, OutputStage::dirtDrive (1.0f)), -0.686587f, 1e-5) << v;
+    }
+
+    for (float v = -4.0f; v <= 4.0f; v += 0.001f)
+        ASSERT_LE (std::fabs (OutputStage::dirt (v, OutputStage::dirtDrive (0.37f))), std::tanh (std::sin (1.0f)) + 1e-6f);
+}
+
+TEST (OutputStage, ZeroBalanceWithDryPassesTheInput)
+{
+    OutputStage stage;
+    stage.balance = 0.0f;
+
+    for (auto x : { 0.3f, -1.0f, 7.5f })
+        EXPECT_EQ (stage.shape (stage.blend (123.0f, x)), x);
+
+    stage.balance = 0.25f;
+    EXPECT_FLOAT_EQ (stage.blend (1.0f, -1.0f), -0.5f);
+}
+
+TEST (OutputStage, DecibelsToGain)
+{
+    struct Case { float dB; float gain; };
+    const Case cases[] = { { 0.0f, 1.0f }, { -16.0f, 0.158489f }, { 6.0f, 1.995262f }, { -70.0f, 0.000316228f },
+                           { -100.0f, 0.0f }, { -150.0f, 0.0f } };
+
+    for (const auto& c : cases)
+        EXPECT_NEAR (veltrane::decibelsToGain (c.dB), c.gain, 1e-6f * std::max (1.0f, c.gain)) << c.dB;
+}
