@@ -210,8 +210,19 @@ void Engine::process (int channel, float* samples, int startSample, int endSampl
 template <bool hold1, bool hold2, bool moving>
 void Engine::runSources (Channel& channel, const float* samples, int n) noexcept
 {
-    auto follower1 = channel.envelope[0];
-    auto follower2 = channel.envelope[1];
+    using simd::Float4;
+
+    // The two followers run side by side in the first two lanes.
+    auto& follower1 = channel.envelope[0];
+    auto& follower2 = channel.envelope[1];
+    const Float4 attackGain { follower1.getAttackGain(), follower2.getAttackGain(), 0.0f, 0.0f };
+    const Float4 attackCoefficient { follower1.getAttackCoefficient(), follower2.getAttackCoefficient(), 0.0f, 0.0f };
+    const Float4 releaseGain { follower1.getReleaseGain(), follower2.getReleaseGain(), 0.0f, 0.0f };
+    const Float4 releaseCoefficient { follower1.getReleaseCoefficient(), follower2.getReleaseCoefficient(), 0.0f, 0.0f };
+    const Float4 sensitivities { sensitivity[0], sensitivity[1], 0.0f, 0.0f };
+    Float4 envelope { follower1.getEnvelope(), follower2.getEnvelope(), 0.0f, 0.0f };
+    Float4 magnitude {};
+
     const auto& lfo1 = channel.lfo[0];
     const auto& lfo2 = channel.lfo[1];
     auto motion1 = channel.lfo[0].getMotion();
@@ -223,8 +234,6 @@ void Engine::runSources (Channel& channel, const float* samples, int n) noexcept
     const auto step1 = glides[0].step;
     const auto step2 = glides[1].step;
     const auto offset = denormalOffset;
-    const auto sensitivity1 = sensitivity[0];
-    const auto sensitivity2 = sensitivity[1];
 
     float* const input = scratch.input;
     float* const envelope1 = scratch.sources[0];
@@ -242,8 +251,10 @@ void Engine::runSources (Channel& channel, const float* samples, int n) noexcept
             x = offset;
 
         input[j] = x;
-        envelope1[j] = follower1.process (sensitivity1 * x);
-        envelope2[j] = follower2.process (sensitivity2 * x);
+        magnitude = EnvelopeFollower::magnitude (sensitivities * x);
+        envelope = EnvelopeFollower::follow (magnitude, envelope, attackGain, attackCoefficient, releaseGain, releaseCoefficient);
+        envelope1[j] = envelope[0];
+        envelope2[j] = envelope[1];
         lfoOut1[j] = lfo1.tick<hold1> (motion1);
         lfoOut2[j] = lfo2.tick<hold2> (motion2);
 
@@ -256,8 +267,12 @@ void Engine::runSources (Channel& channel, const float* samples, int n) noexcept
         }
     }
 
-    channel.envelope[0] = follower1;
-    channel.envelope[1] = follower2;
+    if (n > 0)
+    {
+        follower1.setState (envelope[0], magnitude[0]);
+        follower2.setState (envelope[1], magnitude[1]);
+    }
+
     channel.lfo[0].getMotion() = motion1;
     channel.lfo[1].getMotion() = motion2;
     glides[0].smoothed = smoothed1;
@@ -267,36 +282,53 @@ void Engine::runSources (Channel& channel, const float* samples, int n) noexcept
 template <int wetKind, int shaper>
 void Engine::runOutput (float* samples, int n) const noexcept
 {
+    using simd::Float4;
     const auto gain1 = gain[0];
     const auto gain2 = gain[1];
     const auto hardDrive = OutputStage::hardClipDrive (outputStage.amount);
     const auto dirtDrive = OutputStage::dirtDrive (outputStage.amount);
     const auto stage = outputStage;
-    const float* const out1 = scratch.output[0];
-    const float* const out2 = scratch.output[1];
-    const float* const input = scratch.input;
 
-    for (int j = 0; j < n; ++j)
+    auto outputOf = [&] (Float4 out1, Float4 out2, Float4 dry)
     {
-        float wet;
+        Float4 wet;
 
         if constexpr (wetKind == bothDelays)
-            wet = gain1 * out1[j] + gain2 * out2[j];
+            wet = out1 * gain1 + out2 * gain2;
         else if constexpr (wetKind == delay1Only)
-            wet = gain1 * out1[j];
+            wet = out1 * gain1;
         else
-            wet = gain2 * out2[j];
+            wet = out2 * gain2;
 
-        const auto v = stage.blend (wet, input[j]);
+        const auto v = stage.blend (wet, dry);
 
         if constexpr (shaper == (int) Shaper::softClipper)
-            samples[j] = OutputStage::softClip (v);
+            return OutputStage::softClip (v);
         else if constexpr (shaper == (int) Shaper::hardClipper)
-            samples[j] = OutputStage::hardClip (v, hardDrive);
+            return OutputStage::hardClip (v, hardDrive);
         else if constexpr (shaper == (int) Shaper::dirt)
-            samples[j] = OutputStage::dirt (v, dirtDrive);
+            return OutputStage::dirt (v, dirtDrive);
         else
-            samples[j] = v;
+            return v;
+    };
+
+    const float* const out1 = scratch.output[0];
+    const float* const out2 = scratch.output[1];
+    const float* const dry = scratch.input;
+    int j = 0;
+
+    for (; j + 4 <= n; j += 4)
+        simd::store (samples + j, outputOf (simd::load (out1 + j), simd::load (out2 + j), simd::load (dry + j)));
+
+    if (j < n) // the last one to three samples, padded to four lanes
+    {
+        float a[4] {}, b[4] {}, c[4] {}, y[4];
+        const auto rest = (size_t) (n - j);
+        std::copy_n (out1 + j, rest, a);
+        std::copy_n (out2 + j, rest, b);
+        std::copy_n (dry + j, rest, c);
+        simd::store (y, outputOf (simd::load (a), simd::load (b), simd::load (c)));
+        std::copy_n (y, rest, samples + j);
     }
 }
 

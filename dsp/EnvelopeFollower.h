@@ -1,5 +1,7 @@
 #pragma once
 
+#include "Simd.h"
+
 #include <cmath>
 #include <limits>
 
@@ -8,7 +10,7 @@ namespace veltrane
 
 // A one-pole peak follower with separate attack and release times. Its output, the envelope,
 // is never negative; it exceeds 1 when the (already scaled) input exceeds full scale.
-// Small and trivially copyable, so a caller may run it from a local copy. Audio thread only.
+// Audio thread only.
 class EnvelopeFollower
 {
 public:
@@ -34,21 +36,39 @@ public:
 
     float process (float input) noexcept
     {
-        auto a = std::fabs (input);
-
-        if (! (a <= std::numeric_limits<float>::max())) // inf or NaN must not stick in the state
-            a = 0.0f;
-
-        lastInput = a;
-
-        // Both candidates are formed before the comparison picks one, which keeps the
-        // comparison off the sample-to-sample dependency chain; equality counts as falling.
-        const auto rising = attackGain * a + attackCoefficient * envelope;
-        const auto falling = releaseGain * a + releaseCoefficient * envelope;
-        envelope = a > envelope ? rising : falling;
+        lastInput = magnitude (input);
+        envelope = follow (lastInput, envelope, attackGain, attackCoefficient, releaseGain, releaseCoefficient);
         return envelope;
     }
 
+    // |input|, with inf and NaN counted as silence so that they cannot stick in the state.
+    // T is float, or simd::Float4 for followers side by side.
+    template <typename T>
+    static T magnitude (T input) noexcept
+    {
+        const T a = simd::abs (input);
+        return simd::select (a <= T {} + std::numeric_limits<float>::max(), a, T {});
+    }
+
+    // One step: both candidates are formed before the comparison picks one, which keeps the
+    // comparison off the sample-to-sample dependency chain; equality counts as falling.
+    template <typename T>
+    static T follow (T a, T previous, T attackGain, T attackCoefficient, T releaseGain, T releaseCoefficient) noexcept
+    {
+        const T rising = attackGain * a + attackCoefficient * previous;
+        const T falling = releaseGain * a + releaseCoefficient * previous;
+        return simd::select (a > previous, rising, falling);
+    }
+
+    // For callers that run several followers side by side from local copies of their state.
+    void setState (float newEnvelope, float newLastInput) noexcept
+    {
+        envelope = newEnvelope;
+        lastInput = newLastInput;
+    }
+
+    float getAttackGain() const noexcept { return attackGain; }
+    float getReleaseGain() const noexcept { return releaseGain; }
     float getEnvelope() const noexcept { return envelope; }
     float getAttackSamples() const noexcept { return attackSamples; }
     float getReleaseSamples() const noexcept { return releaseSamples; }
