@@ -1,0 +1,13 @@
+# Release at -O2 unless told otherwise; ccache when it is installed.
+if (NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYPES)
+    set (CMAKE_BUILD_TYPE Release CACHE STRING "Build type" FORCE)
+endif()
+
+set (CMAKE_CXX_FLAGS_RELEASE "-O2 -DNDEBUG" CACHE STRING "" FORCE)
+set (CMAKE_C_FLAGS_RELEASE "-O2 -DNDEBUG" CACHE STRING "" FORCE)
+
+find_program (CCACHE_PROGRAM ccache)
+if (CCACHE_PROGRAM)
+    set (CMAKE_C_COMPILER_LAUNCHER "${CCACHE_PROGRAM}")
+    set (CMAKE_CXX_COMPILER_LAUNCHER "${CCACHE_PROGRAM}")
+endif()

@@ -1,0 +1,129 @@
+#pragma once
+
+#include "PluginParameter.h"
+
+#include <juce_audio_processors/juce_audio_processors.h>
+
+#include <array>
+#include <atomic>
+
+namespace veltrane
+{
+
+// The plug-in instance the host talks to: 33 parameters, the engine, the preset
+// library, MIDI learn and the per-user preferences.
+//
+// Threads: the host's audio thread runs processBlock; the host's automation and
+// user-interface threads set and read parameters and the state; the message thread
+// runs the editor. Requests from the editor (preset load, clear of MIDI bindings)
+// are atomics that the next audio block serves.
+class VeltraneAudioProcessor final : public juce::AudioProcessor
+{
+public:
+    VeltraneAudioProcessor();
+    ~VeltraneAudioProcessor() override;
+
+    const juce::String getName() const override;
+    void prepareToPlay (double sampleRate, int samplesPerBlock) override;
+    void releaseResources() override {}
+    void processBlock (juce::AudioBuffer<float>& buffer, juce::MidiBuffer& midiMessages) override;
+    using juce::AudioProcessor::processBlock;
+    void reset() override {}
+    bool isBusesLayoutSupported (const BusesLayout& layouts) const override;
+    // How long echoes ring on after the input stops, from the current delay times and
+    // feedbacks (at most a minute). Never 0, so hosts keep processing after silence.
+    double getTailLengthSeconds() const override;
+
+    const juce::String getInputChannelName (int channelIndex) const override;
+    const juce::String getOutputChannelName (int channelIndex) const override;
+    bool isInputChannelStereoPair (int) const override { return true; }
+    bool isOutputChannelStereoPair (int) const override { return true; }
+    bool silenceInProducesSilenceOut() const { return false; }
+    bool acceptsMidi() const override { return true; }
+    bool producesMidi() const override { return false; }
+
+    juce::AudioProcessorEditor* createEditor() override;
+    bool hasEditor() const override { return true; }
+
+    int getNumPrograms() override { return 0; }
+    int getCurrentProgram() override { return 0; }
+    void setCurrentProgram (int) override {}
+    const juce::String getProgramName (int) override { return {}; }
+    void changeProgramName (int, const juce::String&) override {}
+
+    void getStateInformation (juce::MemoryBlock& destData) override;
+    void setStateInformation (const void* data, int sizeInBytes) override;
+
+    // Indexed parameter operations; index is 0..32.
+    int getNumParameters() override { return Param::count; }
+    const juce::String getParameterName (int index) override;
+    float getParameter (int index) override;
+    const juce::String getParameterText (int index) override;
+    // Takes newValue when it lies in [0, 1] and ignores it otherwise (NaN too); the
+    // last-parameter name and text follow this parameter either way.
+    void setParameter (int index, float newValue) override;
+
+    // setParameter, then every listener (the host's wrapper among them) hears the
+    // value the parameter now holds.
+    void setParameterNotifyingHost (int index, float newValue);
+
+    // The one way in for editor controls (fromEditor true) and learned MIDI
+    // controllers (false): the change is bracketed by a gesture; from the editor it
+    // also arms or forgets a MIDI binding when learn or unlearn mode is on.
+    void setParameterFromControl (int index, float newValue, bool fromEditor);
+
+    juce::String getLastParameterName() const;
+    juce::String getLastParameterText() const;
+
+    PluginParameter& getParameterRecord (int index) noexcept { return parameters[(size_t) index]; }
+    const PluginParameter& getParameterRecord (int index) const noexcept { return parameters[(size_t) index]; }
+    float getPhysicalValue (int index) const noexcept
+    {
+        return parameters[(size_t) index].physicalValue.load (std::memory_order_relaxed);
+    }
+
+    // Draws new values for every parameter outside the skip list, then turns
+    // Randomize off. Audio thread, at a block start.
+    void randomize();
+    // Fixes the Randomize generator's seed, for reproducible renders and tests.
+    void seedRandomiser (juce::int64 seed) { randomiser.setSeed (seed); }
+
+    // Block-start requests: a pending preset load, a clear of all MIDI bindings and
+    // Randomize, in that order. Audio thread.
+    void serveBlockStartRequests();
+    // A MIDI control change inside a block: learning and learned parameters.
+    void handleControlChange (int controllerNumber, int controllerValue);
+    // A MIDI program change: the preset of that number loads at the next block.
+    void requestPresetLoad (int presetIndex) noexcept;
+
+    // Preset library and preferences.
+    juce::StringArray getPresetNames() const;
+    juce::String getPresetName() const;
+    void setPresetName (const juce::String& newName);
+    void savePreset();
+    void loadPreset (const juce::String& path);
+    void revealPresetFolder();
+    void setLastEditorSize (float width, float height);
+
+    // Requests and modes shared with the editor and served by the audio block.
+    std::atomic<bool> midiLearnActive { false };
+    std::atomic<bool> midiUnlearnActive { false };
+    std::atomic<bool> midiClearPending { false };
+    std::atomic<bool> presetLoadPending { false };
+    std::atomic<int> presetToLoad { 0 };
+    std::atomic<bool> presetListChanged { true };
+
+    float lastEditorWidth = 1000.0f;
+    float lastEditorHeight = 500.0f;
+
+private:
+    void loadRequestedPreset();   // the preset numbered presetToLoad, at a block start
+
+    std::array<PluginParameter, Param::count> parameters;
+    juce::Random randomiser;
+    std::atomic<int> lastParameterIndex { -1 };   // -1 until a parameter is set
+
+    JUCE_DECLARE_NON_COPYABLE_WITH_LEAK_DETECTOR (VeltraneAudioProcessor)
+};
+
+} // namespace veltrane

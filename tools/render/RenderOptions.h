@@ -1,0 +1,36 @@
+#pragma once
+
+#include <juce_core/juce_core.h>
+
+#include <optional>
+
+namespace veltrane::render
+{
+
+struct ParameterSetting
+{
+    juce::String identifier;
+    float value = 0.0f;
+};
+
+struct RenderOptions
+{
+    juce::File pluginPath;
+    juce::File inputFile;            // empty: the built-in test signal
+    juce::File outputFile;
+    juce::File plotFile;             // empty: no picture
+    juce::File presetFile;           // a .vtp preset applied before rendering
+    juce::File stateFile;            // a saved state chunk applied before rendering
+    double sampleRate = 44100.0;
+    int blockSize = 512;
+    double tailSeconds = 2.0;
+    juce::Array<ParameterSetting> parameters;
+    bool infoOnly = false;
+};
+
+// Parses the command line; returns the options or sets error to one line for the user.
+std::optional<RenderOptions> parseArguments (const juce::StringArray& args, juce::String& error);
+
+juce::String usage();
+
+} // namespace veltrane::render
