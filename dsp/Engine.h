@@ -90,9 +90,12 @@ public:
     float getSmoothedTimeMs (int delayIndex) const noexcept { return glides[delayIndex].smoothed; }
     float getGlideStep (int delayIndex) const noexcept { return glides[delayIndex].step; }
 
-    DelayLine& getDelayLine (int channel, int delayIndex) noexcept { return channels[channel].delay[delayIndex]; }
-    EnvelopeFollower& getEnvelopeFollower (int channel, int index) noexcept { return channels[channel].envelope[index]; }
-    Lfo& getLfo (int channel, int index) noexcept { return channels[channel].lfo[index]; }
+    DelayLine& getDelayLine (int channel, int delayIndex) noexcept { return channels[(size_t) channel].delay[delayIndex]; }
+    const DelayLine& getDelayLine (int channel, int delayIndex) const noexcept { return channels[(size_t) channel].delay[delayIndex]; }
+    EnvelopeFollower& getEnvelopeFollower (int channel, int index) noexcept { return channels[(size_t) channel].envelope[index]; }
+    const EnvelopeFollower& getEnvelopeFollower (int channel, int index) const noexcept { return channels[(size_t) channel].envelope[index]; }
+    Lfo& getLfo (int channel, int index) noexcept { return channels[(size_t) channel].lfo[index]; }
+    const Lfo& getLfo (int channel, int index) const noexcept { return channels[(size_t) channel].lfo[index]; }
 
 private:
     struct Channel

@@ -69,6 +69,7 @@ public:
     }
 
     Motion& getMotion() noexcept { return motion; }
+    const Motion& getMotion() const noexcept { return motion; }
     int getWave() const noexcept { return wave; }
     float getFrequency() const noexcept { return frequency; }
     float getPhaseIncrement() const noexcept { return motion.phaseIncrement; }

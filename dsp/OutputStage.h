@@ -13,12 +13,6 @@ enum class Shaper { dry, softClipper, hardClipper, dirt };
 // Index of the "MixMode" choice list.
 enum class MixMode { parallel, chain, reverseChain, solo1, solo2, stereoParallel, reverseStereoParallel };
 
-// Amplitude factor of a level in dB; -100 dB or less is silence.
-inline float decibelsToGain (float dB) noexcept
-{
-    return dB > -100.0f ? std::pow (10.0f, dB * 0.05f) : 0.0f;
-}
-
 // The last stage of every output sample: the wet signal blended with the dry input, then
 // shaped. There is no limiter after it. Single precision throughout.
 struct OutputStage

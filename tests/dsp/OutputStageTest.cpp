@@ -87,13 +87,3 @@ TEST (OutputStage, ZeroBalanceWithDryPassesTheInput)
     stage.balance = 0.25f;
     EXPECT_FLOAT_EQ (stage.blend (1.0f, -1.0f), -0.5f);
 }
-
-TEST (OutputStage, DecibelsToGain)
-{
-    struct Case { float dB; float gain; };
-    const Case cases[] = { { 0.0f, 1.0f }, { -16.0f, 0.158489f }, { 6.0f, 1.995262f }, { -70.0f, 0.000316228f },
-                           { -100.0f, 0.0f }, { -150.0f, 0.0f } };
-
-    for (const auto& c : cases)
-        EXPECT_NEAR (veltrane::decibelsToGain (c.dB), c.gain, 1e-6f * std::max (1.0f, c.gain)) << c.dB;
-}
