@@ -54,14 +54,27 @@ inline Float4 sqrt (Float4 v) noexcept
 inline Int4 truncate (Float4 v) noexcept { return __builtin_convertvector (v, Int4); }
 inline Float4 toFloat (Int4 v) noexcept { return __builtin_convertvector (v, Float4); }
 
-inline Double2 lowToDouble (Float4 v) noexcept { return __builtin_convertvector (__builtin_shufflevector (v, v, 0, 1), Double2); }
-inline Double2 highToDouble (Float4 v) noexcept { return __builtin_convertvector (__builtin_shufflevector (v, v, 2, 3), Double2); }
+inline Double2 lowToDouble (Float4 v) noexcept
+{
+#if defined (__SSE2__)
+    return __builtin_ia32_cvtps2pd (v);
+#else
+    return __builtin_convertvector (__builtin_shufflevector (v, v, 0, 1), Double2);
+#endif
+}
 
+inline Double2 highToDouble (Float4 v) noexcept { return lowToDouble (__builtin_shufflevector (v, v, 2, 3, 2, 3)); }
+
+// Rounds both pairs to float: low to lanes 0 and 1, high to lanes 2 and 3.
 inline Float4 toFloat (Double2 low, Double2 high) noexcept
 {
+#if defined (__SSE2__)
+    return __builtin_shufflevector (__builtin_ia32_cvtpd2ps (low), __builtin_ia32_cvtpd2ps (high), 0, 1, 4, 5);
+#else
     const auto l = __builtin_convertvector (low, Float2);
     const auto h = __builtin_convertvector (high, Float2);
     return __builtin_shufflevector (l, h, 0, 1, 2, 3);
+#endif
 }
 
 inline bool allTrue (Int4 mask) noexcept
