@@ -37,13 +37,23 @@ void DelayLine::clear() noexcept
 
 void DelayLine::process (const float* input, const float* delays, const float* feedbacks, float* output, int n) noexcept
 {
-    if (feedbacks != nullptr)
-        run<true> (input, delays, feedbacks, output, n);
+    if (delays != nullptr)
+    {
+        if (feedbacks != nullptr)
+            run<true, true> (input, delays, feedbacks, output, n);
+        else
+            run<true, false> (input, delays, &feedback, output, n);
+    }
     else
-        run<false> (input, delays, &feedback, output, n);
+    {
+        if (feedbacks != nullptr)
+            run<false, true> (input, &delaySamples, feedbacks, output, n);
+        else
+            run<false, false> (input, &delaySamples, &feedback, output, n);
+    }
 }
 
-template <bool perSampleFeedback>
+template <bool perSampleDelay, bool perSampleFeedback>
 void DelayLine::run (const float* input, const float* delays, const float* feedbacks, float* output, int n) noexcept
 {
     using namespace simd;
@@ -61,6 +71,17 @@ void DelayLine::run (const float* input, const float* delays, const float* feedb
     int w = writeIndex;
     float position = readPosition;
 
+    // Clamped to [0, length]: a delay pushed past either end (a source above 1, NaN) reads
+    // the oldest entry instead of memory outside the buffer.
+    auto clamp = [size4] (Float4 d)
+    {
+        d = select (d > splat (0.0f), d, splat (0.0f));
+        return select (d < size4, d, size4);
+    };
+
+    const auto steadyDelay = clamp (splat (delays[0]));
+    const auto steadyDelayAllowsGroups = allTrue (steadyDelay > splat (4.0f));
+
     for (int j = 0; j < n;)
     {
         // Four samples at once where that is exact: the same operations lane by lane, with all
@@ -69,13 +90,9 @@ void DelayLine::run (const float* input, const float* delays, const float* feedb
         // writes stay short of the end of the buffer.
         if (j + 4 <= n && w <= size - 4)
         {
-            // Clamped to [0, length]: a delay pushed past either end (a source above 1, NaN)
-            // reads the oldest entry instead of memory outside the buffer.
-            auto d = load (delays + j);
-            d = select (d > splat (0.0f), d, splat (0.0f));
-            d = select (d < size4, d, size4);
+            const auto d = perSampleDelay ? clamp (load (delays + j)) : steadyDelay;
 
-            if (allTrue (d > splat (4.0f)))
+            if (perSampleDelay ? allTrue (d > splat (4.0f)) : steadyDelayAllowsGroups)
             {
                 auto p = toFloat (w + lanes) - d;
                 p += select (p < splat (0.0f), size4, splat (0.0f));
@@ -127,7 +144,7 @@ void DelayLine::run (const float* input, const float* delays, const float* feedb
             }
         }
 
-        position = (float) w - std::min (std::max (0.0f, delays[j]), sizeF);
+        position = (float) w - std::min (std::max (0.0f, delays[perSampleDelay ? j : 0]), sizeF);
 
         if (position < 0.0f)
             position += sizeF;
@@ -159,7 +176,9 @@ void DelayLine::run (const float* input, const float* delays, const float* feedb
 
     writeIndex = w;
     readPosition = position;
-    delaySamples = delays[n - 1];
+
+    if constexpr (perSampleDelay)
+        delaySamples = delays[n - 1];
 
     if constexpr (perSampleFeedback)
         feedback = feedbacks[n - 1];

@@ -69,9 +69,9 @@ public:
     }
 
     // n samples: input[j] in, output[j] out, with the delay delays[j] and the feedback factor
-    // feedbacks[j], or the current feedback for every sample when feedbacks is null. The delay
-    // is kept within [0, length] so that the line never reads outside its buffer. Leaves
-    // delaySamples and feedback at the last values used.
+    // feedbacks[j]; a null delays or feedbacks uses the current delaySamples or feedback for
+    // every sample. The delay is kept within [0, length] so that the line never reads outside
+    // its buffer. Leaves delaySamples and feedback at the last values used.
     void process (const float* input, const float* delays, const float* feedbacks, float* output, int n) noexcept;
 
     float getDelaySamples() const noexcept { return delaySamples; }
@@ -82,7 +82,7 @@ public:
     int getWriteIndex() const noexcept { return writeIndex; }
 
 private:
-    template <bool perSampleFeedback>
+    template <bool perSampleDelay, bool perSampleFeedback>
     void run (const float* input, const float* delays, const float* feedbacks, float* output, int n) noexcept;
 
     int length = initialLength;

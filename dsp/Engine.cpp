@@ -6,6 +6,7 @@
 #include <cmath>
 #include <limits>
 #include <type_traits>
+#include <utility>
 
 namespace veltrane
 {
@@ -44,8 +45,9 @@ namespace
 
     bool isFiniteSample (float x) noexcept { return std::fabs (x) <= std::numeric_limits<float>::max(); }
 
-    // Calls fn with a compile-time copy of flag, so that a setting fixed for the block picks a
-    // specialised loop instead of being tested on every sample.
+    // Calls fn with a compile-time copy of flag (or of choice, 0 <= choice < count), so that a
+    // setting fixed for the block picks a specialised loop instead of being tested on every
+    // sample.
     template <typename Fn>
     void withFlag (bool flag, Fn&& fn)
     {
@@ -53,6 +55,18 @@ namespace
             fn (std::true_type {});
         else
             fn (std::false_type {});
+    }
+
+    template <int count, int first = 0, typename Fn>
+    void withChoice (int choice, Fn&& fn)
+    {
+        if constexpr (first + 1 < count)
+        {
+            if (choice != first)
+                return withChoice<count, first + 1> (choice, std::forward<Fn> (fn));
+        }
+
+        fn (std::integral_constant<int, first> {});
     }
 }
 
@@ -158,6 +172,10 @@ void Engine::beginBlock (const EngineSettings& settings, int numChannelsInBlock,
         sensitivity[d] = settings.envelope[d].sensitivity;
     }
 
+    for (int source = 0; source < 4; ++source)
+        sourceRead[source] = timeModulation[0].source == source || timeModulation[1].source == source
+                          || feedbackModulation[0].source == source || feedbackModulation[1].source == source;
+
     mixMode = settings.mixMode >= 0 && settings.mixMode <= (int) MixMode::reverseStereoParallel ? settings.mixMode : 0;
     outputStage.balance = settings.dryWet;
     outputStage.shaper = settings.shaper >= 0 && settings.shaper <= (int) Shaper::dirt ? settings.shaper : 0;
@@ -207,7 +225,7 @@ void Engine::process (int channel, float* samples, int startSample, int endSampl
 
 // Envelopes, LFOs and the glide each carry a sample-to-sample dependency; running them in one
 // loop from local copies lets those chains overlap instead of following one another.
-template <bool hold1, bool hold2, bool moving>
+template <int lfo1Use, int lfo2Use, bool moving>
 void Engine::runSources (Channel& channel, const float* samples, int n) noexcept
 {
     using simd::Float4;
@@ -255,8 +273,15 @@ void Engine::runSources (Channel& channel, const float* samples, int n) noexcept
         envelope = EnvelopeFollower::follow (magnitude, envelope, attackGain, attackCoefficient, releaseGain, releaseCoefficient);
         envelope1[j] = envelope[0];
         envelope2[j] = envelope[1];
-        lfoOut1[j] = lfo1.tick<hold1> (motion1);
-        lfoOut2[j] = lfo2.tick<hold2> (motion2);
+        if constexpr (lfo1Use == lfoUnread)
+            lfo1.advance (motion1);
+        else
+            lfoOut1[j] = lfo1.tick<lfo1Use == lfoHolding> (motion1);
+
+        if constexpr (lfo2Use == lfoUnread)
+            lfo2.advance (motion2);
+        else
+            lfoOut2[j] = lfo2.tick<lfo2Use == lfoHolding> (motion2);
 
         if constexpr (moving)
         {
@@ -336,40 +361,51 @@ void Engine::processChunk (int channelIndex, float* samples, int n) noexcept
 {
     auto& channel = channels[(size_t) channelIndex];
 
-    withFlag (channel.lfo[0].getWave() == Lfo::sampleAndHold, [&] (auto hold1) {
-        withFlag (channel.lfo[1].getWave() == Lfo::sampleAndHold, [&] (auto hold2) {
-            withFlag (gliding, [&] (auto moving) { runSources<hold1, hold2, moving> (channel, samples, n); });
+    // An LFO that no modulation reads this block only moves its phase; "Sample & Hold" also
+    // keeps counting its cycles.
+    auto lfoUseOf = [this, &channel] (int index)
+    {
+        if (channel.lfo[index].getWave() == Lfo::sampleAndHold)
+            return lfoHolding;
+
+        return sourceRead[2 + index] ? lfoTable : lfoUnread;
+    };
+
+    withChoice<3> (lfoUseOf (0), [&] (auto lfo1Use) {
+        withChoice<3> (lfoUseOf (1), [&] (auto lfo2Use) {
+            withFlag (gliding, [&] (auto moving) { runSources<lfo1Use, lfo2Use, moving> (channel, samples, n); });
         });
     });
+
+    // Per-sample delays while a glide moves or a time modulation runs; otherwise the lines
+    // use their steady base delay (a null array).
+    const float* delays[2] = { nullptr, nullptr };
+    const float* feedbacks[2] = { nullptr, nullptr };
 
     for (int d = 0; d < 2; ++d)
     {
         auto& line = channel.delay[d];
-        float* const base = scratch.baseDelay[d];
-
-        if (! gliding)
-            std::fill_n (base, n, line.baseDelayFor (glides[d].smoothed));
-
-        line.setBaseDelay (base[n - 1]);
-    }
-
-    const float* delays[2];
-    const float* feedbacks[2];
-
-    for (int d = 0; d < 2; ++d)
-    {
-        const auto& line = channel.delay[d];
-        delays[d] = scratch.baseDelay[d];
-        feedbacks[d] = nullptr;
+        const float* const base = gliding ? scratch.baseDelay[d] : nullptr;
+        line.setBaseDelay (gliding ? base[n - 1] : line.baseDelayFor (glides[d].smoothed));
+        delays[d] = base;
 
         if (const auto& mod = timeModulation[d]; mod.source >= 0)
         {
-            const float* const base = scratch.baseDelay[d];
             const float* const source = scratch.sources[mod.source];
             float* const modulated = scratch.modulatedDelay[d];
 
-            for (int j = 0; j < n; ++j)
-                modulated[j] = line.modulatedDelay (base[j], mod.depth, mod.sign * source[j]);
+            if (base != nullptr)
+            {
+                for (int j = 0; j < n; ++j)
+                    modulated[j] = line.modulatedDelay (base[j], mod.depth, mod.sign * source[j]);
+            }
+            else
+            {
+                const auto steadyBase = line.getBaseDelaySamples();
+
+                for (int j = 0; j < n; ++j)
+                    modulated[j] = line.modulatedDelay (steadyBase, mod.depth, mod.sign * source[j]);
+            }
 
             delays[d] = modulated;
         }
@@ -377,12 +413,12 @@ void Engine::processChunk (int channelIndex, float* samples, int n) noexcept
         if (const auto& mod = feedbackModulation[d]; mod.source >= 0)
         {
             const auto swing = line.feedbackSwing (mod.depth);
-            const auto base = line.getBaseFeedback();
+            const auto baseFeedback = line.getBaseFeedback();
             const float* const source = scratch.sources[mod.source];
             float* const modulated = scratch.modulatedFeedback[d];
 
             for (int j = 0; j < n; ++j)
-                modulated[j] = swing * (mod.sign * source[j]) + base;
+                modulated[j] = swing * (mod.sign * source[j]) + baseFeedback;
 
             feedbacks[d] = modulated;
         }

@@ -138,7 +138,10 @@ private:
 
     void processChunk (int channel, float* samples, int n) noexcept;
 
-    template <bool hold1, bool hold2, bool gliding>
+    // How the sources loop runs an LFO.
+    enum LfoUse { lfoUnread, lfoTable, lfoHolding };
+
+    template <int lfo1Use, int lfo2Use, bool gliding>
     void runSources (Channel& channel, const float* samples, int n) noexcept;
 
     template <int wetKind, int shaper>
@@ -157,6 +160,7 @@ private:
     float gain[2] = { 1.0f, 1.0f };
     Modulation timeModulation[2];
     Modulation feedbackModulation[2];
+    bool sourceRead[4] = {}; // whether any modulation reads Scratch::sources[i] this block
     int mixMode = 0;
     OutputStage outputStage;
 

@@ -480,3 +480,32 @@ TEST (Engine, SampleAndHoldDiffersBetweenChannels)
     Engine same (42);
     EXPECT_EQ (rig.engine.getLfo (1, 1).getTable (Lfo::sampleAndHold), same.getLfo (1, 1).getTable (Lfo::sampleAndHold));
 }
+
+TEST (Engine, LfosNobodyReadsKeepMovingExactly)
+{
+    // Whether or not a modulation reads an LFO in a block, its phase, last index and hold
+    // position move the same way.
+    for (int wave : { (int) Lfo::triangle, (int) Lfo::sampleAndHold })
+    {
+        Rig read, unread;
+
+        for (auto* rig : { &read, &unread })
+            rig->settings.lfo[0] = { wave, 37.0f, false, 6 };
+
+        read.settings.delay[0].timeModSource = (int) ModSource::lfo1;
+        read.settings.delay[0].timeModDepth = 0.2f;
+
+        std::vector<float> a (3000, 0.1f), b (3000, 0.1f), c (3000, 0.1f), d (3000, 0.1f);
+        read.run (a, &b, 300);
+        unread.run (c, &d, 300);
+
+        for (int channel = 0; channel < 2; ++channel)
+        {
+            const auto& x = read.engine.getLfo (channel, 0).getMotion();
+            const auto& y = unread.engine.getLfo (channel, 0).getMotion();
+            EXPECT_EQ (x.phase, y.phase) << wave;
+            EXPECT_EQ (x.lastIndex, y.lastIndex) << wave;
+            EXPECT_EQ (x.holdIndex, y.holdIndex) << wave;
+        }
+    }
+}
