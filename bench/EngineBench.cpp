@@ -45,19 +45,17 @@ namespace
         }
 
         std::vector<float> buffers[2] = { std::vector<float> (blockSize), std::vector<float> (blockSize) };
+        float* channels[2] = { buffers[0].data(), buffers[1].data() };
 
         auto block = [&]
         {
-            engine.beginBlock (settings, numChannels, blockSize);
-
             for (int c = 0; c < numChannels; ++c)
-            {
-                std::memcpy (buffers[c].data(), source.data() + c * blockSize, sizeof (float) * blockSize);
-                engine.process (c, buffers[c].data(), 0, blockSize);
-            }
+                std::memcpy (channels[c], source.data() + c * blockSize, sizeof (float) * blockSize);
 
-            benchmark::DoNotOptimize (buffers[0].data());
-            benchmark::DoNotOptimize (buffers[1].data());
+            engine.beginBlock (settings, numChannels, blockSize);
+            engine.process (channels, 0, blockSize);
+            benchmark::DoNotOptimize (channels[0]);
+            benchmark::DoNotOptimize (channels[1]);
         };
 
         for (int i = 0; i < 400; ++i) // let both delay times settle first

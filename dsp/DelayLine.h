@@ -1,5 +1,7 @@
 #pragma once
 
+#include "Simd.h"
+
 #include <vector>
 
 namespace veltrane
@@ -44,9 +46,12 @@ public:
     // depth in [0, 1], source value m normally in [-1, 1].
     void modulateTime (float depth, float m) noexcept { delaySamples = modulatedDelay (baseDelaySamples, depth, m); }
 
-    float modulatedDelay (float base, float depth, float m) const noexcept
+    // T is float, or simd::Float4 for four samples at once.
+    template <typename T>
+    T modulatedDelay (T base, float depth, T m) const noexcept
     {
-        const auto headroom = base > (float) length * 0.5f ? (float) length - base : base;
+        const auto size = T {} + (float) length;
+        const T headroom = simd::select (base > size * 0.5f, size - base, base);
         return headroom * depth * m + base;
     }
 

@@ -131,15 +131,18 @@ Engine::Modulation Engine::modulationFor (int sourceIndex, float depth) noexcept
     return m;
 }
 
-void Engine::beginBlock (const EngineSettings& settings, int numChannelsInBlock, int numSamples) noexcept
+void Engine::beginBlock (const EngineSettings& settings, int numChannelsInBlock, int numSamples,
+                         const bool (&lfoRestarted)[2]) noexcept
 {
     denormalOffset = -denormalOffset;
+    channelsInUse = std::clamp (numChannelsInBlock, 1, numChannels);
+    numSamples = std::max (numSamples, 0);
 
     // Each processed sample of each channel moves the glide one step, and the remaining
     // distance shrinks by 1 - k per block with k = steps / glideSteps. For k >= 2 that would
     // swing ever wider, so such a long block lands exactly on the target instead.
     const auto glideSteps = sampleRate * 0.25;
-    const auto stepsInBlock = (double) std::clamp (numChannelsInBlock, 0, numChannels) * (double) std::max (numSamples, 0);
+    const auto stepsInBlock = (double) channelsInUse * (double) numSamples;
     gliding = false;
 
     for (int d = 0; d < 2; ++d)
@@ -164,7 +167,17 @@ void Engine::beginBlock (const EngineSettings& settings, int numChannelsInBlock,
             }
         }
 
-        gliding = gliding || glide.smoothed + glide.step != glide.smoothed;
+        // Channel 1 takes up the glide where channel 0's numSamples steps leave it.
+        glideCursor[0][d] = glide.smoothed;
+        glideCursor[1][d] = glide.smoothed;
+
+        if (glide.smoothed + glide.step != glide.smoothed)
+        {
+            gliding = true;
+
+            for (int i = 0; i < numSamples; ++i)
+                glideCursor[1][d] += glide.step;
+        }
 
         timeModulation[d] = modulationFor (settings.delay[d].timeModSource, settings.delay[d].timeModDepth);
         feedbackModulation[d] = modulationFor (settings.delay[d].feedbackModSource, settings.delay[d].feedbackModDepth);
@@ -203,109 +216,139 @@ void Engine::beginBlock (const EngineSettings& settings, int numChannelsInBlock,
             lfo.updateIncrement();
         }
     }
+
+    for (int l = 0; l < 2; ++l)
+        if (lfoRestarted[l])
+            channels[1].lfo[l].restart();
 }
 
 void Engine::restartLfo (int lfoIndex) noexcept
 {
-    if (lfoIndex < 0 || lfoIndex > 1)
-        return;
-
-    for (auto& channel : channels)
-        channel.lfo[lfoIndex].restart();
+    if (lfoIndex == 0 || lfoIndex == 1)
+        channels[0].lfo[lfoIndex].restart();
 }
 
-void Engine::process (int channel, float* samples, int startSample, int endSample) noexcept
+void Engine::process (float* const* samples, int startSample, int endSample) noexcept
 {
-    if (channel < 0 || channel >= numChannels || samples == nullptr)
+    if (samples == nullptr)
         return;
 
     for (int start = startSample; start < endSample; start += chunkSize)
-        processChunk (channel, samples + start, std::min (chunkSize, endSample - start));
+        processChunk (samples, start, std::min (chunkSize, endSample - start));
+
+    for (int d = 0; d < 2; ++d)
+        glides[d].smoothed = glideCursor[channelsInUse - 1][d];
 }
 
-// Envelopes, LFOs and the glide each carry a sample-to-sample dependency; running them in one
-// loop from local copies lets those chains overlap instead of following one another.
-template <int lfo1Use, int lfo2Use, bool moving>
-void Engine::runSources (Channel& channel, const float* samples, int n) noexcept
+// The input of every channel for the chunk, with the denormal offset added; a stray inf or
+// NaN counts as silence rather than poisoning the lines and followers.
+void Engine::takeInputs (float* const* samples, int offset, int n) noexcept
 {
-    using simd::Float4;
+    using namespace simd;
+    const auto denormal = splat (denormalOffset);
 
-    // The two followers run side by side in the first two lanes.
-    auto& follower1 = channel.envelope[0];
-    auto& follower2 = channel.envelope[1];
-    const Float4 attackGain { follower1.getAttackGain(), follower2.getAttackGain(), 0.0f, 0.0f };
-    const Float4 attackCoefficient { follower1.getAttackCoefficient(), follower2.getAttackCoefficient(), 0.0f, 0.0f };
-    const Float4 releaseGain { follower1.getReleaseGain(), follower2.getReleaseGain(), 0.0f, 0.0f };
-    const Float4 releaseCoefficient { follower1.getReleaseCoefficient(), follower2.getReleaseCoefficient(), 0.0f, 0.0f };
-    const Float4 sensitivities { sensitivity[0], sensitivity[1], 0.0f, 0.0f };
-    Float4 envelope { follower1.getEnvelope(), follower2.getEnvelope(), 0.0f, 0.0f };
+    for (int c = 0; c < channelsInUse; ++c)
+    {
+        const float* const in = samples[c] + offset;
+        float* const x = scratch.input[c];
+        int j = 0;
+
+        for (; j + 4 <= n; j += 4)
+        {
+            const auto v = load (in + j) + denormal;
+            store (x + j, select (abs (v) <= splat (std::numeric_limits<float>::max()), v, denormal));
+        }
+
+        for (; j < n; ++j)
+            x[j] = isFiniteSample (in[j] + denormalOffset) ? in[j] + denormalOffset : denormalOffset;
+    }
+}
+
+// Envelopes, LFOs and glides of every channel in one loop. The envelopes' sample-to-sample
+// chain is the slow part: the four followers (lane 2 * channel + index) share one chain, and
+// the four LFOs run side by side in the same lanes next to it.
+template <int inUse, bool lfosRead, bool moving>
+void Engine::runSources (int n) noexcept
+{
+    using namespace simd;
+    auto& f = channels;
+    auto lanesOf = [&f] (auto getter)
+    {
+        return Float4 { getter (f[0].envelope[0]), getter (f[0].envelope[1]), getter (f[1].envelope[0]), getter (f[1].envelope[1]) };
+    };
+
+    const auto attackGain = lanesOf ([] (const EnvelopeFollower& e) { return e.getAttackGain(); });
+    const auto attackCoefficient = lanesOf ([] (const EnvelopeFollower& e) { return e.getAttackCoefficient(); });
+    const auto releaseGain = lanesOf ([] (const EnvelopeFollower& e) { return e.getReleaseGain(); });
+    const auto releaseCoefficient = lanesOf ([] (const EnvelopeFollower& e) { return e.getReleaseCoefficient(); });
+    const Float4 sensitivities { sensitivity[0], sensitivity[1], sensitivity[0], sensitivity[1] };
+    auto envelope = lanesOf ([] (const EnvelopeFollower& e) { return e.getEnvelope(); });
     Float4 magnitude {};
 
-    const auto& lfo1 = channel.lfo[0];
-    const auto& lfo2 = channel.lfo[1];
-    auto motion1 = channel.lfo[0].getMotion();
-    auto motion2 = channel.lfo[1].getMotion();
-    const auto& line1 = channel.delay[0];
-    const auto& line2 = channel.delay[1];
-    auto smoothed1 = glides[0].smoothed;
-    auto smoothed2 = glides[1].smoothed;
-    const auto step1 = glides[0].step;
-    const auto step2 = glides[1].step;
-    const auto offset = denormalOffset;
+    const Lfo* const lfo[4] = { &f[0].lfo[0], &f[0].lfo[1], &f[1].lfo[0], &f[1].lfo[1] };
+    Lfo::Lanes lfoLanes;
+    const float* table[4];
 
-    float* const input = scratch.input;
-    float* const envelope1 = scratch.sources[0];
-    float* const envelope2 = scratch.sources[1];
-    float* const lfoOut1 = scratch.sources[2];
-    float* const lfoOut2 = scratch.sources[3];
-    float* const base1 = scratch.baseDelay[0];
-    float* const base2 = scratch.baseDelay[1];
+    for (int k = 0; k < 4; ++k)
+    {
+        const auto& m = lfo[k]->getMotion();
+        const auto holding = lfo[k]->getWave() == Lfo::sampleAndHold;
+        lfoLanes.phase[k] = m.phase;
+        lfoLanes.phaseIncrement[k] = m.phaseIncrement;
+        lfoLanes.lastIndex[k] = m.lastIndex;
+        lfoLanes.holdIndex[k] = m.holdIndex;
+        lfoLanes.holding[k] = holding ? -1 : 0;
+        table[k] = lfo[k]->getTable (holding ? Lfo::sampleAndHold : lfo[k]->getWave()).data();
+    }
+
+    float cursor[numChannels][2] = { { glideCursor[0][0], glideCursor[0][1] }, { glideCursor[1][0], glideCursor[1][1] } };
+    const float step[2] = { glides[0].step, glides[1].step };
+    const float* const x0 = scratch.input[0];
+    const float* const x1 = scratch.input[inUse - 1];
 
     for (int j = 0; j < n; ++j)
     {
-        auto x = samples[j] + offset;
-
-        if (! isFiniteSample (x)) // a stray inf or NaN counts as silence rather than poisoning the lines
-            x = offset;
-
-        input[j] = x;
-        magnitude = EnvelopeFollower::magnitude (sensitivities * x);
+        magnitude = EnvelopeFollower::magnitude (sensitivities * Float4 { x0[j], x0[j], x1[j], x1[j] });
         envelope = EnvelopeFollower::follow (magnitude, envelope, attackGain, attackCoefficient, releaseGain, releaseCoefficient);
-        envelope1[j] = envelope[0];
-        envelope2[j] = envelope[1];
-        if constexpr (lfo1Use == lfoUnread)
-            lfo1.advance (motion1);
-        else
-            lfoOut1[j] = lfo1.tick<lfo1Use == lfoHolding> (motion1);
+        store (scratch.envelopes + 4 * j, envelope);
 
-        if constexpr (lfo2Use == lfoUnread)
-            lfo2.advance (motion2);
-        else
-            lfoOut2[j] = lfo2.tick<lfo2Use == lfoHolding> (motion2);
+        const auto index = Lfo::tick (lfoLanes);
+
+        if constexpr (lfosRead)
+            store (scratch.lfos + 4 * j, Float4 { table[0][index[0]], table[1][index[1]], table[2][index[2]], table[3][index[3]] });
 
         if constexpr (moving)
         {
-            smoothed1 += step1;
-            smoothed2 += step2;
-            base1[j] = line1.baseDelayFor (smoothed1);
-            base2[j] = line2.baseDelayFor (smoothed2);
+            for (int c = 0; c < inUse; ++c)
+            {
+                for (int d = 0; d < 2; ++d)
+                {
+                    cursor[c][d] += step[d];
+                    scratch.baseDelay[c][d][j] = f[c].delay[d].baseDelayFor (cursor[c][d]);
+                }
+            }
         }
     }
 
-    if (n > 0)
+    for (int c = 0; c < inUse; ++c)
     {
-        follower1.setState (envelope[0], magnitude[0]);
-        follower2.setState (envelope[1], magnitude[1]);
-    }
+        for (int l = 0; l < 2; ++l)
+        {
+            const auto k = 2 * c + l;
+            f[c].envelope[l].setState (envelope[k], magnitude[k]);
+            auto& m = f[c].lfo[l].getMotion();
+            m.phase = lfoLanes.phase[k];
+            m.lastIndex = lfoLanes.lastIndex[k];
+            m.holdIndex = lfoLanes.holdIndex[k];
+        }
 
-    channel.lfo[0].getMotion() = motion1;
-    channel.lfo[1].getMotion() = motion2;
-    glides[0].smoothed = smoothed1;
-    glides[1].smoothed = smoothed2;
+        for (int d = 0; d < 2; ++d)
+            glideCursor[c][d] = cursor[c][d];
+    }
 }
 
 template <int wetKind, int shaper>
-void Engine::runOutput (float* samples, int n) const noexcept
+void Engine::runOutput (float* samples, const float* dry, int n) const noexcept
 {
     using simd::Float4;
     const auto gain1 = gain[0];
@@ -314,7 +357,7 @@ void Engine::runOutput (float* samples, int n) const noexcept
     const auto dirtDrive = OutputStage::dirtDrive (outputStage.amount);
     const auto stage = outputStage;
 
-    auto outputOf = [&] (Float4 out1, Float4 out2, Float4 dry)
+    auto outputOf = [&] (Float4 out1, Float4 out2, Float4 x)
     {
         Float4 wet;
 
@@ -325,7 +368,7 @@ void Engine::runOutput (float* samples, int n) const noexcept
         else
             wet = out2 * gain2;
 
-        const auto v = stage.blend (wet, dry);
+        const auto v = stage.blend (wet, x);
 
         if constexpr (shaper == (int) Shaper::softClipper)
             return OutputStage::softClip (v);
@@ -339,7 +382,6 @@ void Engine::runOutput (float* samples, int n) const noexcept
 
     const float* const out1 = scratch.output[0];
     const float* const out2 = scratch.output[1];
-    const float* const dry = scratch.input;
     int j = 0;
 
     for (; j + 4 <= n; j += 4)
@@ -357,25 +399,32 @@ void Engine::runOutput (float* samples, int n) const noexcept
     }
 }
 
-void Engine::processChunk (int channelIndex, float* samples, int n) noexcept
+const float* Engine::sourceLanes (const Modulation& modulation, int channel) const noexcept
 {
-    auto& channel = channels[(size_t) channelIndex];
+    const float* lanes = modulation.source < 2 ? scratch.envelopes : scratch.lfos;
+    return lanes + 2 * channel + (modulation.source & 1);
+}
 
-    // An LFO that no modulation reads this block only moves its phase; "Sample & Hold" also
-    // keeps counting its cycles.
-    auto lfoUseOf = [this, &channel] (int index)
-    {
-        if (channel.lfo[index].getWave() == Lfo::sampleAndHold)
-            return lfoHolding;
+void Engine::processChunk (float* const* samples, int offset, int n) noexcept
+{
+    takeInputs (samples, offset, n);
 
-        return sourceRead[2 + index] ? lfoTable : lfoUnread;
-    };
-
-    withChoice<3> (lfoUseOf (0), [&] (auto lfo1Use) {
-        withChoice<3> (lfoUseOf (1), [&] (auto lfo2Use) {
-            withFlag (gliding, [&] (auto moving) { runSources<lfo1Use, lfo2Use, moving> (channel, samples, n); });
+    // Only a modulation needs the LFOs' values; their phases move regardless.
+    withChoice<2> (channelsInUse - 1, [&] (auto inUseLess1) {
+        withFlag (sourceRead[2] || sourceRead[3], [&] (auto lfosRead) {
+            withFlag (gliding, [&] (auto moving) { runSources<inUseLess1 + 1, lfosRead, moving> (n); });
         });
     });
+
+    for (int c = 0; c < channelsInUse; ++c)
+        processChannel (c, samples[c] + offset, n);
+}
+
+// Modulation, the two lines in the mix mode's order and the output stage of one channel,
+// after the sources loop has filled the chunk's inputs, sources and base delays.
+void Engine::processChannel (int c, float* samples, int n) noexcept
+{
+    auto& channel = channels[(size_t) c];
 
     // Per-sample delays while a glide moves or a time modulation runs; otherwise the lines
     // use their steady base delay (a null array).
@@ -385,26 +434,24 @@ void Engine::processChunk (int channelIndex, float* samples, int n) noexcept
     for (int d = 0; d < 2; ++d)
     {
         auto& line = channel.delay[d];
-        const float* const base = gliding ? scratch.baseDelay[d] : nullptr;
-        line.setBaseDelay (gliding ? base[n - 1] : line.baseDelayFor (glides[d].smoothed));
+        const float* const base = gliding ? scratch.baseDelay[c][d] : nullptr;
+        line.setBaseDelay (gliding ? base[n - 1] : line.baseDelayFor (glideCursor[c][d]));
         delays[d] = base;
+
+        // Four samples at a time (the scratch arrays are whole groups of four long); a
+        // source's lane holds one float in every four.
+        auto laneOf = [] (const float* lane, int j) { return simd::Float4 { lane[4 * j], lane[4 * j + 4], lane[4 * j + 8], lane[4 * j + 12] }; };
 
         if (const auto& mod = timeModulation[d]; mod.source >= 0)
         {
-            const float* const source = scratch.sources[mod.source];
+            const float* const source = sourceLanes (mod, c);
             float* const modulated = scratch.modulatedDelay[d];
+            const auto steadyBase = simd::splat (line.getBaseDelaySamples());
 
-            if (base != nullptr)
+            for (int j = 0; j < n; j += 4)
             {
-                for (int j = 0; j < n; ++j)
-                    modulated[j] = line.modulatedDelay (base[j], mod.depth, mod.sign * source[j]);
-            }
-            else
-            {
-                const auto steadyBase = line.getBaseDelaySamples();
-
-                for (int j = 0; j < n; ++j)
-                    modulated[j] = line.modulatedDelay (steadyBase, mod.depth, mod.sign * source[j]);
+                const auto b = base != nullptr ? simd::load (base + j) : steadyBase;
+                simd::store (modulated + j, line.modulatedDelay (b, mod.depth, laneOf (source, j) * mod.sign));
             }
 
             delays[d] = modulated;
@@ -414,11 +461,11 @@ void Engine::processChunk (int channelIndex, float* samples, int n) noexcept
         {
             const auto swing = line.feedbackSwing (mod.depth);
             const auto baseFeedback = line.getBaseFeedback();
-            const float* const source = scratch.sources[mod.source];
+            const float* const source = sourceLanes (mod, c);
             float* const modulated = scratch.modulatedFeedback[d];
 
-            for (int j = 0; j < n; ++j)
-                modulated[j] = swing * (mod.sign * source[j]) + baseFeedback;
+            for (int j = 0; j < n; j += 4)
+                simd::store (modulated + j, swing * (laneOf (source, j) * mod.sign) + baseFeedback);
 
             feedbacks[d] = modulated;
         }
@@ -426,35 +473,30 @@ void Engine::processChunk (int channelIndex, float* samples, int n) noexcept
 
     auto& line1 = channel.delay[0];
     auto& line2 = channel.delay[1];
+    const float* const input = scratch.input[c];
     float* const out1 = scratch.output[0];
     float* const out2 = scratch.output[1];
 
     switch ((MixMode) mixMode)
     {
         case MixMode::chain:
-            line1.process (scratch.input, delays[0], feedbacks[0], out1, n);
+            line1.process (input, delays[0], feedbacks[0], out1, n);
             line2.process (out1, delays[1], feedbacks[1], out2, n);
             break;
 
         case MixMode::reverseChain:
-            line2.process (scratch.input, delays[1], feedbacks[1], out2, n);
+            line2.process (input, delays[1], feedbacks[1], out2, n);
             line1.process (out2, delays[0], feedbacks[0], out1, n);
             break;
 
         default:
-            line1.process (scratch.input, delays[0], feedbacks[0], out1, n);
-            line2.process (scratch.input, delays[1], feedbacks[1], out2, n);
+            line1.process (input, delays[0], feedbacks[0], out1, n);
+            line2.process (input, delays[1], feedbacks[1], out2, n);
             break;
     }
 
-    using OutputRun = void (Engine::*) (float*, int) const noexcept;
-    static constexpr OutputRun outputRuns[3][4] = {
-        { &Engine::runOutput<bothDelays, 0>, &Engine::runOutput<bothDelays, 1>, &Engine::runOutput<bothDelays, 2>, &Engine::runOutput<bothDelays, 3> },
-        { &Engine::runOutput<delay1Only, 0>, &Engine::runOutput<delay1Only, 1>, &Engine::runOutput<delay1Only, 2>, &Engine::runOutput<delay1Only, 3> },
-        { &Engine::runOutput<delay2Only, 0>, &Engine::runOutput<delay2Only, 1>, &Engine::runOutput<delay2Only, 2>, &Engine::runOutput<delay2Only, 3> }
-    };
-
-    (this->*outputRuns[wetKindFor ((MixMode) mixMode, channelIndex)][outputStage.shaper]) (samples, n);
+    withChoice<3> (wetKindFor ((MixMode) mixMode, c), [&] (auto wetKind) {
+        withChoice<4> (outputStage.shaper, [&] (auto shaper) { runOutput<wetKind, shaper> (samples, input, n); });
+    });
 }
-
 } // namespace veltrane

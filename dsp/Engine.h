@@ -57,6 +57,12 @@ enum class ModSource { none, envelope1, reverseEnvelope1, envelope2, reverseEnve
 // host's layout) a delay line per delay, an envelope follower per follower and an LFO per LFO,
 // plus the glide of the two delay times, which both channels share. prepare runs on the
 // message thread; everything else on the audio thread, without allocation or locks.
+//
+// The reference order is channel by channel: all of channel 0's block, then channel 1's, with
+// MIDI handled during channel 0's pass. The engine runs both channels side by side (their
+// envelope chains then overlap) and gives exactly the results of that order: channel 1's glide
+// continues where channel 0's ends, and channel 1's LFOs, which would meet a restart before
+// their own pass, restart at the block start.
 class Engine
 {
 public:
@@ -71,15 +77,18 @@ public:
     // the lines and the followers. LFO phases and the glide carry on.
     void prepare (double newSampleRate);
 
-    // Start of every block: flips the sign of the denormal offset, computes the glide steps for
-    // numChannels * numSamples steps and hands the settings to every object.
-    void beginBlock (const EngineSettings& settings, int numChannels, int numSamples) noexcept;
+    // Start of every block of numSamples samples of numChannels (1 or 2) channels: flips the
+    // sign of the denormal offset, computes the glide steps and hands the settings to every
+    // object. lfoRestarted[k]: a MIDI note restarts LFO k somewhere in this block.
+    void beginBlock (const EngineSettings& settings, int numChannels, int numSamples,
+                     const bool (&lfoRestarted)[2] = { false, false }) noexcept;
 
-    // Processes samples [startSample, endSample) of one channel in place. A block is processed
-    // channel by channel; channel 0's pass may be split at MIDI event positions.
-    void process (int channel, float* samples, int startSample, int endSample) noexcept;
+    // Processes samples [startSample, endSample) of every channel in place; the calls of a block
+    // cover [0, numSamples) in order, split where MIDI events fall.
+    void process (float* const* channels, int startSample, int endSample) noexcept;
 
-    // MIDI note-on: both channels' objects of LFO 0 or 1 restart.
+    // A MIDI note at the current position: channel 0's LFO 0 or 1 restarts here (channel 1's
+    // restarted at the block start, see beginBlock).
     void restartLfo (int lfoIndex) noexcept;
 
     static constexpr double minSampleRate = 1000.0;
@@ -110,25 +119,28 @@ private:
     struct Glide
     {
         float target;   // ms
-        float smoothed; // ms
+        float smoothed; // ms, after the last processed sample of the last channel
         float step;     // ms per processed sample
     };
 
-    // Where a modulation reads its source: one of the per-sample source arrays, maybe negated.
+    // Where a modulation reads its source, maybe negated: the envelope lanes (source 0 and 1)
+    // or the LFO lanes (2 and 3) of Scratch.
     struct Modulation
     {
-        int source = -1; // index into Scratch::sources, -1 = none
+        int source = -1; // -1 = none
         float sign = 1.0f;
         float depth = 0.0f;
     };
 
-    static constexpr int chunkSize = 256;
+    static constexpr int chunkSize = 256; // a multiple of 4
 
     struct Scratch
     {
-        float input[chunkSize];
-        float sources[4][chunkSize]; // envelope 1, envelope 2, LFO 1, LFO 2
-        float baseDelay[2][chunkSize];
+        float input[numChannels][chunkSize]; // denormal offset added, inf and NaN silenced
+        // Four lanes per sample, lane 2 * channel + index: envelope 1 and 2, LFO 1 and 2.
+        float envelopes[chunkSize * 4];
+        float lfos[chunkSize * 4];
+        float baseDelay[numChannels][2][chunkSize]; // while gliding
         float modulatedDelay[2][chunkSize];
         float modulatedFeedback[2][chunkSize];
         float output[2][chunkSize];
@@ -136,35 +148,38 @@ private:
 
     explicit Engine (const std::array<int64_t, 4>& lfoSeeds);
 
-    void processChunk (int channel, float* samples, int n) noexcept;
+    void processChunk (float* const* samples, int offset, int n) noexcept;
+    void processChannel (int channel, float* samples, int n) noexcept;
 
-    // How the sources loop runs an LFO.
-    enum LfoUse { lfoUnread, lfoTable, lfoHolding };
+    void takeInputs (float* const* samples, int offset, int n) noexcept;
 
-    template <int lfo1Use, int lfo2Use, bool gliding>
-    void runSources (Channel& channel, const float* samples, int n) noexcept;
+    template <int channelsInUse, bool lfosRead, bool gliding>
+    void runSources (int n) noexcept;
 
     template <int wetKind, int shaper>
-    void runOutput (float* samples, int n) const noexcept;
+    void runOutput (float* samples, const float* dry, int n) const noexcept;
 
+    const float* sourceLanes (const Modulation& modulation, int channel) const noexcept;
     static Modulation modulationFor (int sourceIndex, float depth) noexcept;
 
     std::array<Channel, numChannels> channels;
     double sampleRate = 44100.0;
     float denormalOffset = 1.0e-25f; // added to every input sample, sign flipped every block
     Glide glides[2] = { { 120.0f, 120.0f, 0.0f }, { 220.0f, 220.0f, 0.0f } };
-    bool gliding = false; // true while a smoothed time still moves within the block
+    float glideCursor[numChannels][2] = {}; // each channel's own smoothed times within the block
+    bool gliding = false;                   // true while a smoothed time still moves within the block
 
     // Per-block settings.
+    int channelsInUse = 2;
     float sensitivity[2] = { 1.0f, 1.0f };
     float gain[2] = { 1.0f, 1.0f };
     Modulation timeModulation[2];
     Modulation feedbackModulation[2];
-    bool sourceRead[4] = {}; // whether any modulation reads Scratch::sources[i] this block
+    bool sourceRead[4] = {}; // whether any modulation reads source i this block
     int mixMode = 0;
     OutputStage outputStage;
 
-    Scratch scratch;
+    Scratch scratch {}; // zeroed, so that a chunk's last group of four never reads garbage
 };
 
 } // namespace veltrane

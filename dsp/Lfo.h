@@ -1,5 +1,7 @@
 #pragma once
 
+#include "Simd.h"
+
 #include <array>
 #include <cstddef>
 #include <cstdint>
@@ -44,16 +46,6 @@ public:
 
     float tick() noexcept { return wave == sampleAndHold ? tick<true> (motion) : tick<false> (motion); }
 
-    // A tick whose output nobody reads: the phase moves exactly as in tick.
-    void advance (Motion& m) const noexcept
-    {
-        m.lastIndex = (int) m.phase;
-        m.phase += m.phaseIncrement;
-
-        if (m.phase >= (float) tableSize)
-            m.phase -= (float) tableSize;
-    }
-
     template <bool holding>
     float tick (Motion& m) const noexcept
     {
@@ -76,6 +68,29 @@ public:
             m.lastIndex = i;
             return tables[(size_t) wave][(size_t) i];
         }
+    }
+
+    // The motion of four oscillators side by side, one per lane.
+    struct Lanes
+    {
+        simd::Float4 phase, phaseIncrement;
+        simd::Int4 lastIndex, holdIndex;
+        simd::Int4 holding; // all bits set in the lanes whose wave is "Sample & Hold"
+    };
+
+    // tick's steps for four oscillators at once: the phases and the "Sample & Hold" cycle
+    // counts move exactly as tick moves them. Returns each lane's table index: the hold
+    // position in holding lanes, the point before the step in the others.
+    static simd::Int4 tick (Lanes& l) noexcept
+    {
+        using namespace simd;
+        const auto size = splat ((float) tableSize);
+        const auto i = truncate (l.phase);
+        l.phase += l.phaseIncrement;
+        l.phase -= select (l.phase >= size, size, splat (0.0f));
+        l.holdIndex = (l.holdIndex - ((i < l.lastIndex) & l.holding)) & (tableSize - 1);
+        l.lastIndex = i;
+        return select (l.holding, l.holdIndex, i);
     }
 
     Motion& getMotion() noexcept { return motion; }

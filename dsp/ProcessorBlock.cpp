@@ -84,44 +84,51 @@ void VeltraneAudioProcessor::processBlock (juce::AudioBuffer<float>& buffer, juc
     const auto numSamples = buffer.getNumSamples();
     const auto numChannels = std::min ({ getTotalNumInputChannels(), buffer.getNumChannels(), Engine::numChannels });
 
-    serveBlockStartRequests();
-    engine.beginBlock (snapshotOf (*this, tempoFrom (getPlayHead())), numChannels, numSamples);
-
-    for (int channel = 0; channel < numChannels; ++channel)
+    // MIDI is read from the raw bytes, so that no message object (nor a SysEx copy) is made.
+    // Events outside the block are ignored.
+    auto eventsInBlock = [&midiMessages, numSamples] (auto&& handle)
     {
-        auto* samples = buffer.getWritePointer (channel);
-
-        if (channel != 0)
-        {
-            engine.process (channel, samples, 0, numSamples);
-            continue;
-        }
-
-        // The first channel's pass stops at every MIDI event inside the block and handles it
-        // there, reading the raw bytes so that no message object (nor a SysEx copy) is made.
-        int done = 0;
-
         for (const auto event : midiMessages)
-        {
-            if (event.samplePosition < 0 || event.samplePosition >= numSamples || event.numBytes < 2)
-                continue;
+            if (event.samplePosition >= 0 && event.samplePosition < numSamples && event.numBytes >= 2)
+                handle (event.samplePosition, event.data, event.numBytes);
+    };
 
-            engine.process (0, samples, done, event.samplePosition);
-            done = event.samplePosition;
+    // A note-on with velocity on MIDI channel 1 restarts LFO 1, on channel 2 LFO 2.
+    auto restartedLfo = [] (const juce::uint8* data, int numBytes)
+    {
+        const auto isNoteOn = (data[0] & 0xf0) == 0x90 && numBytes >= 3 && data[2] > 0;
+        return isNoteOn && (data[0] & 0x0f) < 2 ? data[0] & 0x0f : -1;
+    };
 
-            const auto status = event.data[0];
-            const auto type = status & 0xf0;
+    serveBlockStartRequests();
 
-            if (type == 0xc0)
-                requestPresetLoad (event.data[1]);
-            else if (type == 0xb0 && event.numBytes >= 3)
-                handleControlChange (event.data[1], event.data[2]);
-            else if (type == 0x90 && event.numBytes >= 3 && event.data[2] > 0 && (status & 0x0f) < 2)
-                engine.restartLfo (status & 0x0f); // MIDI channel 1 restarts LFO 1, channel 2 LFO 2
-        }
+    bool lfoRestarted[2] = { false, false };
+    eventsInBlock ([&] (int, const juce::uint8* data, int numBytes) {
+        if (const auto lfo = restartedLfo (data, numBytes); lfo >= 0)
+            lfoRestarted[lfo] = true;
+    });
 
-        engine.process (0, samples, done, numSamples);
-    }
+    engine.beginBlock (snapshotOf (*this, tempoFrom (getPlayHead())), numChannels, numSamples, lfoRestarted);
+
+    // The block runs up to each event, which then takes effect: program changes and learned
+    // controllers for the next block, LFO restarts from here on.
+    auto* const* channels = buffer.getArrayOfWritePointers();
+    int done = 0;
+
+    eventsInBlock ([&] (int position, const juce::uint8* data, int numBytes) {
+        engine.process (channels, done, position);
+        done = position;
+        const auto type = data[0] & 0xf0;
+
+        if (type == 0xc0)
+            requestPresetLoad (data[1]);
+        else if (type == 0xb0 && numBytes >= 3)
+            handleControlChange (data[1], data[2]);
+        else if (const auto lfo = restartedLfo (data, numBytes); lfo >= 0)
+            engine.restartLfo (lfo);
+    });
+
+    engine.process (channels, done, numSamples);
 
     for (auto channel = numChannels; channel < buffer.getNumChannels(); ++channel)
         buffer.clear (channel, 0, numSamples);

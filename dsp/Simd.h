@@ -35,6 +35,7 @@ inline void store (float* p, Float4 v) noexcept { std::memcpy (p, &v, sizeof v);
 // Lanes of a where mask is set (all bits), else lanes of b.
 inline Float4 select (Int4 mask, Float4 a, Float4 b) noexcept { return (Float4) (((Int4) a & mask) | ((Int4) b & ~mask)); }
 inline Double2 select (Long2 mask, Double2 a, Double2 b) noexcept { return (Double2) (((Long2) a & mask) | ((Long2) b & ~mask)); }
+inline Int4 select (Int4 mask, Int4 a, Int4 b) noexcept { return (a & mask) | (b & ~mask); }
 inline float select (bool condition, float a, float b) noexcept { return condition ? a : b; }
 
 inline float abs (float v) noexcept { return __builtin_fabsf (v); }

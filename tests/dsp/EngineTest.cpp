@@ -27,11 +27,9 @@ namespace
             for (int start = 0; start < total; start += blockSize)
             {
                 const auto n = std::min (blockSize, total - start);
+                float* samples[2] = { left.data() + start, right != nullptr ? right->data() + start : nullptr };
                 engine.beginBlock (settings, channels, n);
-                engine.process (0, left.data() + start, 0, n);
-
-                if (right != nullptr)
-                    engine.process (1, right->data() + start, 0, n);
+                engine.process (samples, 0, n);
             }
         }
 
@@ -418,7 +416,7 @@ TEST (Engine, LoudEnvelopeAtFullDepthStaysInsideTheLines)
     }
 }
 
-TEST (Engine, SplittingAChannelPassChangesNothing)
+TEST (Engine, SplittingTheBlockChangesNothing)
 {
     Rig whole, split;
 
@@ -428,26 +426,34 @@ TEST (Engine, SplittingAChannelPassChangesNothing)
         rig->settings.delay[0].timeModSource = (int) ModSource::lfo1;
         rig->settings.delay[0].timeModDepth = 0.3f;
         rig->settings.delay[0].timeMs = 700.0f;
+        rig->settings.shaper = (int) Shaper::dirt;
     }
 
-    std::vector<float> a (2048), b;
+    std::vector<float> a (2048), b (2048);
 
     for (size_t i = 0; i < a.size(); ++i)
+    {
         a[i] = std::sin ((float) i * 0.01f);
+        b[i] = std::cos ((float) i * 0.013f);
+    }
 
-    b = a;
+    auto c = a, d = b;
 
     for (int start = 0; start < 2048; start += 512)
     {
-        whole.engine.beginBlock (whole.settings, 1, 512);
-        whole.engine.process (0, a.data() + start, 0, 512);
-        split.engine.beginBlock (split.settings, 1, 512);
+        float* wholeSamples[2] = { a.data() + start, b.data() + start };
+        whole.engine.beginBlock (whole.settings, 2, 512);
+        whole.engine.process (wholeSamples, 0, 512);
 
-        for (auto [from, to] : { std::pair (0, 1), std::pair (1, 100), std::pair (100, 300), std::pair (300, 512) })
-            split.engine.process (0, b.data() + start, from, to);
+        float* splitSamples[2] = { c.data() + start, d.data() + start };
+        split.engine.beginBlock (split.settings, 2, 512);
+
+        for (auto [from, to] : { std::pair (0, 1), std::pair (1, 100), std::pair (100, 303), std::pair (303, 512) })
+            split.engine.process (splitSamples, from, to);
     }
 
-    EXPECT_EQ (a, b);
+    EXPECT_EQ (a, c);
+    EXPECT_EQ (b, d);
 }
 
 TEST (Engine, LfoRestartMidBlockLeavesTheRightChannelAhead)
@@ -457,11 +463,12 @@ TEST (Engine, LfoRestartMidBlockLeavesTheRightChannelAhead)
     std::vector<float> left (512), right (512);
     rig.run (left, &right);
 
-    rig.engine.beginBlock (rig.settings, 2, 512);
-    rig.engine.process (0, left.data(), 0, 100);
+    float* samples[2] = { left.data(), right.data() };
+    const bool restarts[2] = { true, false };
+    rig.engine.beginBlock (rig.settings, 2, 512, restarts);
+    rig.engine.process (samples, 0, 100);
     rig.engine.restartLfo (0);
-    rig.engine.process (0, left.data(), 100, 512);
-    rig.engine.process (1, right.data(), 0, 512);
+    rig.engine.process (samples, 100, 512);
 
     const auto increment = rig.engine.getLfo (0, 0).getPhaseIncrement();
     auto phaseAfter = [increment] (int ticks) { float p = 0.0f; for (int i = 0; i < ticks; ++i) p += increment; return p; };
