@@ -79,6 +79,14 @@ public:
     // its buffer. Leaves delaySamples and feedback at the last values used.
     void process (const float* input, const float* delays, const float* feedbacks, float* output, int n) noexcept;
 
+    // Both lines of a channel over the same n samples, exactly as first.process and then
+    // second.process would run them sample by sample: the first line takes input; the second
+    // takes input too, or, chained, the first's output of the same sample. The lines share
+    // their write position (they are resized, cleared and run together), and run side by side.
+    static void processPair (DelayLine& first, DelayLine& second, bool chained, const float* input,
+                             const float* firstDelays, const float* firstFeedbacks, float* firstOutput,
+                             const float* secondDelays, const float* secondFeedbacks, float* secondOutput, int n) noexcept;
+
     float getDelaySamples() const noexcept { return delaySamples; }
     float getBaseDelaySamples() const noexcept { return baseDelaySamples; }
     float getFeedback() const noexcept { return feedback; }
@@ -89,6 +97,11 @@ public:
 private:
     template <bool perSampleDelay, bool perSampleFeedback>
     void run (const float* input, const float* delays, const float* feedbacks, float* output, int n) noexcept;
+
+    template <typename FirstSettings, typename SecondSettings, bool chained>
+    static void runPair (DelayLine& first, DelayLine& second, const float* input,
+                         const float* firstDelays, const float* firstFeedbacks, float* firstOutput,
+                         const float* secondDelays, const float* secondFeedbacks, float* secondOutput, int n) noexcept;
 
     int length = initialLength;
     float delaySamples;

@@ -471,29 +471,27 @@ void Engine::processChannel (int c, float* samples, int n) noexcept
         }
     }
 
+    // The lines run side by side; a line with per-sample feedbacks takes per-sample delays too.
+    for (int d = 0; d < 2; ++d)
+    {
+        if (feedbacks[d] != nullptr && delays[d] == nullptr)
+        {
+            std::fill_n (scratch.modulatedDelay[d], n, channel.delay[d].getBaseDelaySamples());
+            delays[d] = scratch.modulatedDelay[d];
+        }
+    }
+
     auto& line1 = channel.delay[0];
     auto& line2 = channel.delay[1];
     const float* const input = scratch.input[c];
     float* const out1 = scratch.output[0];
     float* const out2 = scratch.output[1];
 
-    switch ((MixMode) mixMode)
-    {
-        case MixMode::chain:
-            line1.process (input, delays[0], feedbacks[0], out1, n);
-            line2.process (out1, delays[1], feedbacks[1], out2, n);
-            break;
-
-        case MixMode::reverseChain:
-            line2.process (input, delays[1], feedbacks[1], out2, n);
-            line1.process (out2, delays[0], feedbacks[0], out1, n);
-            break;
-
-        default:
-            line1.process (input, delays[0], feedbacks[0], out1, n);
-            line2.process (input, delays[1], feedbacks[1], out2, n);
-            break;
-    }
+    if ((MixMode) mixMode == MixMode::reverseChain)
+        DelayLine::processPair (line2, line1, true, input, delays[1], feedbacks[1], out2, delays[0], feedbacks[0], out1, n);
+    else
+        DelayLine::processPair (line1, line2, (MixMode) mixMode == MixMode::chain, input,
+                                delays[0], feedbacks[0], out1, delays[1], feedbacks[1], out2, n);
 
     withChoice<3> (wetKindFor ((MixMode) mixMode, c), [&] (auto wetKind) {
         withChoice<4> (outputStage.shaper, [&] (auto shaper) { runOutput<wetKind, shaper> (samples, input, n); });

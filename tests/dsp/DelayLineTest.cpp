@@ -261,3 +261,49 @@ TEST (DelayLine, BlocksMatchSampleBySampleProcessing)
         EXPECT_EQ (blockOut, singleOut) << "per-sample feedback " << perSampleFeedback;
     }
 }
+
+TEST (DelayLine, PairMatchesOneLineAfterTheOther)
+{
+    constexpr int n = 6000;
+    std::vector<float> input (n), delaysA (n), delaysB (n), feedbacks (n);
+
+    for (int i = 0; i < n; ++i)
+    {
+        input[(size_t) i] = std::sin ((float) i * 0.07f) + ((i % 1000) == 0 ? 1.0f : 0.0f);
+        delaysA[(size_t) i] = 700.0f + 690.0f * std::sin ((float) i * 0.003f);   // dips below 4 samples
+        delaysB[(size_t) i] = (float) (i % 1500) * 0.5f + 0.25f;
+        feedbacks[(size_t) i] = 0.6f + 0.3f * std::cos ((float) i * 0.02f);
+    }
+
+    struct Case { bool chained; bool perSampleA; bool perSampleFeedbackA; bool perSampleB; };
+    const Case cases[] = { { false, false, false, false }, { true, false, false, false }, { false, true, true, false },
+                           { true, true, false, true }, { true, true, true, true }, { false, false, false, true } };
+
+    for (const auto& c : cases)
+    {
+        DelayLine pairA, pairB, soloA, soloB;
+
+        for (auto* line : { &pairA, &pairB, &soloA, &soloB })
+        {
+            line->setBaseDelay (333.0f);
+            line->setBaseFeedback (0.7f);
+        }
+
+        std::vector<float> pairOutA (n), pairOutB (n), soloOutA (n), soloOutB (n);
+
+        for (int start = 0; start < n; start += 256)
+        {
+            const auto count = std::min (256, n - start);
+            const auto* dA = c.perSampleA ? delaysA.data() + start : nullptr;
+            const auto* fA = c.perSampleFeedbackA ? feedbacks.data() + start : nullptr;
+            const auto* dB = c.perSampleB ? delaysB.data() + start : nullptr;
+            DelayLine::processPair (pairA, pairB, c.chained, input.data() + start, dA, fA, pairOutA.data() + start,
+                                    dB, nullptr, pairOutB.data() + start, count);
+            soloA.process (input.data() + start, dA, fA, soloOutA.data() + start, count);
+            soloB.process (c.chained ? soloOutA.data() + start : input.data() + start, dB, nullptr, soloOutB.data() + start, count);
+        }
+
+        EXPECT_EQ (pairOutA, soloOutA) << "chained " << c.chained;
+        EXPECT_EQ (pairOutB, soloOutB) << "chained " << c.chained;
+    }
+}
