@@ -25,7 +25,22 @@ target_sources (Veltrane PRIVATE
     plugin/HostParameter.cpp
     plugin/VeltraneAudioProcessor.cpp
     dsp/ProcessorBlock.cpp
-    persistence/ProcessorPersistence.cpp)
+    persistence/Preferences.cpp
+    persistence/PresetLibrary.cpp
+    persistence/ProcessorPersistence.cpp
+    persistence/SafeXml.cpp
+    persistence/StateChunk.cpp
+    editor/PanelLayout.cpp
+    editor/DelayComponent.cpp
+    editor/LfoComponent.cpp
+    editor/EnvelopeComponent.cpp
+    editor/GlobalPanel.cpp
+    editor/PresetComponent.cpp
+    editor/MidiComponent.cpp
+    editor/VeltraneAudioProcessorEditor.cpp
+    look/VeltraneLook.cpp
+    look/VeltraneBackground.cpp
+    look/TarnwellLogo.cpp)
 
 target_include_directories (Veltrane PUBLIC "${PROJECT_SOURCE_DIR}")
 

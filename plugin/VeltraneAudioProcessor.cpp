@@ -1,6 +1,7 @@
 #include "VeltraneAudioProcessor.h"
 
 #include "HostParameter.h"
+#include "../editor/VeltraneAudioProcessorEditor.h"
 
 namespace veltrane
 {
@@ -17,9 +18,14 @@ VeltraneAudioProcessor::VeltraneAudioProcessor()
 
     for (int i = 0; i < Param::count; ++i)
         addParameter (new HostParameter (*this, i));
+
+    openPersistentState();
 }
 
-VeltraneAudioProcessor::~VeltraneAudioProcessor() = default;
+VeltraneAudioProcessor::~VeltraneAudioProcessor()
+{
+    closePersistentState();
+}
 
 const juce::String VeltraneAudioProcessor::getName() const
 {
@@ -62,7 +68,7 @@ const juce::String VeltraneAudioProcessor::getOutputChannelName (int channelInde
 
 juce::AudioProcessorEditor* VeltraneAudioProcessor::createEditor()
 {
-    return new juce::GenericAudioProcessorEditor (*this);
+    return new VeltraneAudioProcessorEditor (*this);
 }
 
 const juce::String VeltraneAudioProcessor::getParameterName (int index)
@@ -142,10 +148,7 @@ void VeltraneAudioProcessor::randomize()
 void VeltraneAudioProcessor::serveBlockStartRequests()
 {
     if (presetLoadPending.load())
-    {
         loadRequestedPreset();
-        presetLoadPending.store (false);
-    }
 
     if (midiClearPending.load())
     {

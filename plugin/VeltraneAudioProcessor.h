@@ -2,11 +2,14 @@
 
 #include "PluginParameter.h"
 #include "../dsp/Engine.h"
+#include "../persistence/PresetLibrary.h"
 
 #include <juce_audio_processors/juce_audio_processors.h>
 
 #include <array>
 #include <atomic>
+#include <memory>
+#include <mutex>
 
 namespace veltrane
 {
@@ -97,16 +100,23 @@ public:
     // A MIDI program change: the preset of that number loads at the next block.
     void requestPresetLoad (int presetIndex) noexcept;
 
-    // Preset library and preferences.
+    // Preset library and preferences. presetName and the preset lists are guarded by
+    // presetLock: the message and host threads take it, the audio thread only ever
+    // tries it and leaves a preset load pending for the next block when it cannot.
     juce::StringArray getPresetNames() const;
     juce::String getPresetName() const;
     void setPresetName (const juce::String& newName);
     void savePreset();
+    // Applies the preset file at path. Message thread or tests: it waits for the
+    // lock to set the name; the audio thread loads through loadRequestedPreset.
     void loadPreset (const juce::String& path);
+    // Opens the preset folder in the desktop's file manager without waiting for it;
+    // nothing without a desktop session.
     void revealPresetFolder();
     void setLastEditorSize (float width, float height);
 
     // Requests and modes shared with the editor and served by the audio block.
+    // A load is requested by storing presetToLoad first, then presetLoadPending.
     std::atomic<bool> midiLearnActive { false };
     std::atomic<bool> midiUnlearnActive { false };
     std::atomic<bool> midiClearPending { false };
@@ -121,7 +131,13 @@ public:
     const Engine& getEngine() const noexcept { return engine; }
 
 private:
-    void loadRequestedPreset();   // the preset numbered presetToLoad, at a block start
+    // The preset numbered presetToLoad, at a block start; clears presetLoadPending
+    // once served and keeps it set when the preset lock is busy. Audio thread.
+    void loadRequestedPreset();
+    void applyPresetValues (const PresetContents& preset);
+    // Constructor and destructor steps of the preset library and the preferences.
+    void openPersistentState();
+    void closePersistentState();
 
     std::array<PluginParameter, Param::count> parameters;
     // Two channels of delay lines, envelope followers and LFOs; each LFO's "Sample & Hold"
@@ -129,6 +145,12 @@ private:
     Engine engine { (uint64_t) juce::Random().nextInt64() };
     juce::Random randomiser;
     std::atomic<int> lastParameterIndex { -1 };   // -1 until a parameter is set
+
+    std::unique_ptr<juce::PropertiesFile> properties;   // per-user preferences
+    mutable std::mutex presetLock;                       // guards the three below
+    PresetLibrary presetLibrary;
+    juce::StringArray presetNames;                       // copy of the library's list for the editor
+    juce::String presetName { "Init" };
 
     JUCE_DECLARE_NON_COPYABLE_WITH_LEAK_DETECTOR (VeltraneAudioProcessor)
 };

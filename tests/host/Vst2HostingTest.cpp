@@ -126,3 +126,58 @@ TEST (Vst3Hosting, LoadsTheBundleWithTheSameIdentity)
     EXPECT_EQ (parameters[0]->getCurrentValueAsText(), "120.00 Ms");
     EXPECT_EQ (parameters[32]->getName (64), "LFO2SyncedRate");
 }
+
+namespace
+{
+// The effect's own chunk (effGetChunk), without JUCE's bank wrapping around it.
+juce::MemoryBlock effectChunk (juce::AudioPluginInstance& plugin)
+{
+    auto* effect = static_cast<Vst2::AEffect*> (plugin.getPlatformSpecificData());
+    void* data = nullptr;
+    const auto size = effect->dispatcher (effect, Vst2::effGetChunk, 0, 0, &data, 0.0f);
+    return size > 0 && data != nullptr ? juce::MemoryBlock (data, (size_t) size) : juce::MemoryBlock();
+}
+
+void setEffectChunk (juce::AudioPluginInstance& plugin, const juce::String& text)
+{
+    juce::MemoryBlock chunk;
+    chunk.append ("VC2!", 4);
+    const auto length = juce::ByteOrder::swapIfBigEndian ((juce::uint32) text.getNumBytesAsUTF8());
+    chunk.append (&length, 4);
+    chunk.append (text.toRawUTF8(), text.getNumBytesAsUTF8());
+    chunk.append ("", 1);
+
+    auto* effect = static_cast<Vst2::AEffect*> (plugin.getPlatformSpecificData());
+    effect->dispatcher (effect, Vst2::effSetChunk, 0, (juce::pointer_sized_int) chunk.getSize(), chunk.getData(), 0.0f);
+}
+}
+
+TEST (Vst2Hosting, SavedStateRestoresValuesBindingsAndPresetName)
+{
+    juce::VSTPluginFormat format;
+    auto original = loadPlugin (format, VELTRANE_VST2_BINARY);
+    ASSERT_NE (original, nullptr);
+
+    // Bindings and a name reach the effect through a chunk; values through the host.
+    setEffectChunk (*original, "<VELTRANE_STATE PresetName=\"Wide &amp; &quot;dark&quot;\" Delay1TimeCC=\"74\" LFO2SyncedRateCC=\"1\"/>");
+    const auto& parameters = original->getParameters();
+    ASSERT_EQ (parameters.size(), 33);
+    for (int i = 0; i < parameters.size(); ++i)
+        parameters[i]->setValue ((float) (i + 1) / 37.0f);
+
+    const auto expected = effectChunk (*original);
+    const auto text = juce::String::fromUTF8 (static_cast<const char*> (expected.getData()) + 8, (int) expected.getSize() - 9);
+    EXPECT_TRUE (text.contains ("PresetName=\"Wide &amp; &quot;dark&quot;\"")) << text;
+    EXPECT_TRUE (text.contains ("Delay1TimeCC=\"74\"")) << text;
+
+    juce::MemoryBlock hostState;
+    original->getStateInformation (hostState);
+
+    auto restored = loadPlugin (format, VELTRANE_VST2_BINARY);
+    ASSERT_NE (restored, nullptr);
+    restored->setStateInformation (hostState.getData(), (int) hostState.getSize());
+
+    EXPECT_EQ (effectChunk (*restored), expected);
+    for (int i = 0; i < parameters.size(); ++i)
+        EXPECT_EQ (restored->getParameters()[i]->getValue(), (float) (i + 1) / 37.0f) << i;
+}

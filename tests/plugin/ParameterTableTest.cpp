@@ -58,7 +58,7 @@ static_assert (std::size (expectedRows) == Param::count);
 // The generator Randomize must reproduce: a 48-bit linear congruential draw.
 float referenceNextFloat (juce::int64& seed)
 {
-    seed = (seed * 0x5deece66dLL + 11) & 0xffffffffffffLL;
+    seed = (juce::int64) (((juce::uint64) seed * 0x5deece66dULL + 11) & 0xffffffffffffULL);
     return (float) (juce::uint32) (seed >> 16) * 2.3283064e-10f;
 }
 }

@@ -2,6 +2,7 @@
 // WAV file (or a built-in signal of short percussive hits) through it.
 
 #include "RenderOptions.h"
+#include "tools/common/PrivateHome.h"
 
 #include <juce_audio_formats/juce_audio_formats.h>
 #include <juce_audio_processors/juce_audio_processors.h>
@@ -351,6 +352,7 @@ int run (const RenderOptions& options)
 int main (int argc, char* argv[])
 {
     using namespace veltrane::render;
+    const veltrane::tools::PrivateHome privateHome;
     const juce::ScopedJuceInitialiser_GUI juce;
 
     // JUCE's hosting logs each plug-in load; the tool's own output is its one line.

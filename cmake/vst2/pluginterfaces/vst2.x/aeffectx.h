@@ -1,11 +1,14 @@
 // Forwards JUCE's VST 2.4 includes to Debian's FST headers (fst-dev).
 //
-// FST declares the speaker arrangement with a flexible array of speakers, while
-// JUCE sizes it as if it held eight: JUCE allocates max (8, n) - 8 extra entries
-// beyond sizeof (VstSpeakerArrangement) and then writes n of them, which overruns
-// the heap for every arrangement of up to eight channels. The arrangement is
-// therefore redeclared here with its eight fixed entries, the layout of the
-// original interface, so hosting and wrapper code allocate and copy it safely.
+// Two FST structs are shorter than the original interface's, and JUCE relies on
+// the original sizes; both are redeclared here with the original layout:
+// - the speaker arrangement has a flexible array of speakers, while JUCE sizes it
+//   as if it held eight: it allocates max (8, n) - 8 extra entries beyond
+//   sizeof (VstSpeakerArrangement) and then writes n of them, overrunning the heap
+//   for every arrangement of up to eight channels;
+// - the pin properties end at the 8-character short label, while JUCE's wrapper
+//   writes 9 bytes into it (label and terminator), which the original 48 spare
+//   bytes after it absorb; without them a host's stack is overrun.
 #pragma once
 
 #ifndef FST2VST
@@ -21,3 +24,14 @@ struct VeltraneVstSpeakerArrangement
 };
 
 #define VstSpeakerArrangement VeltraneVstSpeakerArrangement
+
+struct VeltraneVstPinProperties
+{
+    char label[64];
+    int flags;
+    int arrangementType;
+    char shortLabel[8];
+    char future[48];
+};
+
+#define VstPinProperties VeltraneVstPinProperties
