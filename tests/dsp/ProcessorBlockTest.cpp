@@ -254,20 +254,35 @@ TEST (ProcessorBlock, RandomizeSparesItsSkipListAndTurnsItselfOff)
     EXPECT_GE (changed, 20); // 25 drawn, a discrete one may land on its old entry
 }
 
-TEST (ProcessorBlock, ProgramChangeIsServedAtTheNextBlock)
+TEST (ProcessorBlock, ProgramChangeIsHeardFromTheNextBlock)
 {
     Rig rig;
-    juce::AudioBuffer<float> audio (2, 512);
-    audio.clear();
+    rig.set (Param::DryWet, 0.0f);
+    rig.processor.setPresetName ("Dry Only");
+    rig.processor.savePreset();
+    rig.set (Param::DryWet, 1.0f);
+    const auto program = rig.processor.getPresetNames().indexOf ("Dry Only");
+    ASSERT_GE (program, 0);
+
+    juce::AudioBuffer<float> input (2, 1024);
+
+    for (int i = 0; i < input.getNumSamples(); ++i)
+        for (int c = 0; c < 2; ++c)
+            input.setSample (c, i, 0.3f * std::sin ((float) i * 0.05f) + 0.01f);
+
+    juce::AudioBuffer<float> audio (input);
     juce::MidiBuffer midi;
-    midi.addEvent (juce::MidiMessage::programChange (1, 3), 200);
-
+    midi.addEvent (juce::MidiMessage::programChange (1, program), 200);
     rig.run (audio, 512, midi);
-    EXPECT_TRUE (rig.processor.presetLoadPending.load());
-    EXPECT_EQ (rig.processor.presetToLoad.load(), 3);
 
-    rig.run (audio);
+    for (int i = 0; i < 512; ++i)
+        ASSERT_LT (std::abs (audio.getSample (0, i)), 1.0e-6f) << "still wet (nothing echoes yet) at " << i;
+
+    for (int i = 512; i < 1024; ++i)
+        ASSERT_EQ (audio.getSample (0, i), input.getSample (0, i)) << "the preset's dry balance from the next block, at " << i;
+
     EXPECT_FALSE (rig.processor.presetLoadPending.load());
+    EXPECT_EQ (rig.processor.getPresetName(), "Dry Only");
 }
 
 TEST (ProcessorBlock, LearnedControllerChangesTheSoundFromTheNextBlock)
