@@ -83,7 +83,7 @@ namespace
 
     // readOne for four consecutive samples, lane by lane the same operations; the delays are
     // clamped and above 4 samples. A steady delay reads neighbouring slots, loaded at once.
-    inline Float4 readFour (const float* data, Float4 writePositions, Float4 delays, Float4 size, float& position) noexcept
+    inline Float4 readFour (const float* data, Float4 writePositions, Float4 delays, Float4 size, Float4& positions) noexcept
     {
         auto p = writePositions - delays;
         p += select (p < splat (0.0f), size, splat (0.0f));
@@ -103,7 +103,7 @@ namespace
             next = Float4 { data[index[0] + 1], data[index[1] + 1], data[index[2] + 1], data[index[3] + 1] };
         }
 
-        position = p[3];
+        positions = p;
         return current + (next - current) * fraction;
     }
 
@@ -174,33 +174,44 @@ void DelayLine::run (const float* input, const float* delays, const float* feedb
     const auto size = splat ((float) length);
     const Settings<perSampleDelay, perSampleFeedback> line (delays, feedbacks, size);
     int w = writeIndex;
-    float position = readPosition;
+    auto positions = splat (readPosition); // lane 3: the latest read position
 
     for (int j = 0; j < n;)
     {
-        // Four samples at once where that is exact: all reads of a group happen before its
-        // writes, which matches the one-by-one order as long as no lane reads a slot that an
-        // earlier lane writes (every delay above 4 samples) and the writes stay short of the end.
-        if (j + 4 <= n && w <= length - 4)
+        // Runs of four samples at once where that is exact: all reads of a group happen before
+        // its writes, which matches the one-by-one order as long as no lane reads a slot that
+        // an earlier lane writes (every delay above 4 samples) and the writes stay short of the
+        // buffer's end; one sample at a time where not.
+        const auto groups = std::min (n - j, length - w) / 4;
+        auto writePositions = toFloat (w + lanes);
+        int g = 0;
+
+        for (; g < groups; ++g, j += 4, w += 4, writePositions += 4.0f)
         {
-            if (const auto d = line.delayFour (j, size); line.allowsGroup (d))
-            {
-                Double2 gainLow, gainHigh;
-                line.gainFour (j, gainLow, gainHigh);
-                const auto out = readFour (data, toFloat (w + lanes), d, size, position);
-                store (data + w, writtenFour (out, load (input + j), gainLow, gainHigh));
-                store (output + j, out);
+            const auto d = line.delayFour (j, size);
 
-                if (w == 0)
-                    data[length] = data[0];
+            if (! line.allowsGroup (d))
+                break;
 
-                w = w + 4 == length ? 0 : w + 4;
-                j += 4;
-                continue;
-            }
+            Double2 gainLow, gainHigh;
+            line.gainFour (j, gainLow, gainHigh);
+            const auto out = readFour (data, writePositions, d, size, positions);
+            store (data + w, writtenFour (out, load (input + j), gainLow, gainHigh));
+            store (output + j, out);
+
+            if (w == 0) // before any later group reads it
+                data[length] = data[0];
         }
 
+        if (w == length)
+            w = 0;
+
+        if (g == groups && groups > 0)
+            continue;
+
+        float position;
         const auto out = readOne (data, w, line.delay (j), size[0], position);
+        positions[3] = position;
         data[w] = writtenOne (out, input[j], line.gain (j));
 
         if (w == 0)
@@ -212,7 +223,7 @@ void DelayLine::run (const float* input, const float* delays, const float* feedb
     }
 
     writeIndex = w;
-    readPosition = position;
+    readPosition = positions[3];
     delaySamples = line.delay (n - 1);
     feedback = line.feedback (n - 1);
 }
@@ -266,45 +277,54 @@ void DelayLine::runPair (DelayLine& first, DelayLine& second, const float* input
     const FirstSettings lineA (firstDelays, firstFeedbacks, size);
     const SecondSettings lineB (secondDelays, secondFeedbacks, size);
     int w = first.writeIndex;
-    float positionA = first.readPosition, positionB = second.readPosition;
+    auto positionsA = splat (first.readPosition), positionsB = splat (second.readPosition);
 
     for (int j = 0; j < n;)
     {
-        if (j + 4 <= n && w <= length - 4)
+        // As in run: runs of groups of four where both lines allow them, else one sample.
+        const auto groups = std::min (n - j, length - w) / 4;
+        auto writePositions = toFloat (w + lanes);
+        int g = 0;
+
+        for (; g < groups; ++g, j += 4, w += 4, writePositions += 4.0f)
         {
             const auto dA = lineA.delayFour (j, size);
             const auto dB = lineB.delayFour (j, size);
 
-            if (lineA.allowsGroup (dA) && lineB.allowsGroup (dB))
+            if (! (lineA.allowsGroup (dA) && lineB.allowsGroup (dB)))
+                break;
+
+            Double2 gainLowA, gainHighA, gainLowB, gainHighB;
+            lineA.gainFour (j, gainLowA, gainHighA);
+            lineB.gainFour (j, gainLowB, gainHighB);
+            const auto in = load (input + j);
+            const auto outA = readFour (a, writePositions, dA, size, positionsA);
+            const auto outB = readFour (b, writePositions, dB, size, positionsB);
+            store (a + w, writtenFour (outA, in, gainLowA, gainHighA));
+            store (b + w, writtenFour (outB, chained ? outA : in, gainLowB, gainHighB));
+            store (firstOutput + j, outA);
+            store (secondOutput + j, outB);
+
+            if (w == 0) // before any later group reads them
             {
-                Double2 gainLowA, gainHighA, gainLowB, gainHighB;
-                lineA.gainFour (j, gainLowA, gainHighA);
-                lineB.gainFour (j, gainLowB, gainHighB);
-                const auto writePositions = toFloat (w + lanes);
-                const auto in = load (input + j);
-                const auto outA = readFour (a, writePositions, dA, size, positionA);
-                const auto outB = readFour (b, writePositions, dB, size, positionB);
-                store (a + w, writtenFour (outA, in, gainLowA, gainHighA));
-                store (b + w, writtenFour (outB, chained ? outA : in, gainLowB, gainHighB));
-                store (firstOutput + j, outA);
-                store (secondOutput + j, outB);
-
-                if (w == 0)
-                {
-                    a[length] = a[0];
-                    b[length] = b[0];
-                }
-
-                w = w + 4 == length ? 0 : w + 4;
-                j += 4;
-                continue;
+                a[length] = a[0];
+                b[length] = b[0];
             }
         }
 
+        if (w == length)
+            w = 0;
+
+        if (g == groups && groups > 0)
+            continue;
+
+        float positionA, positionB;
         const auto outA = readOne (a, w, lineA.delay (j), size[0], positionA);
         a[w] = writtenOne (outA, input[j], lineA.gain (j));
         const auto outB = readOne (b, w, lineB.delay (j), size[0], positionB);
         b[w] = writtenOne (outB, chained ? outA : input[j], lineB.gain (j));
+        positionsA[3] = positionA;
+        positionsB[3] = positionB;
 
         if (w == 0)
         {
@@ -319,8 +339,8 @@ void DelayLine::runPair (DelayLine& first, DelayLine& second, const float* input
     }
 
     first.writeIndex = second.writeIndex = w;
-    first.readPosition = positionA;
-    second.readPosition = positionB;
+    first.readPosition = positionsA[3];
+    second.readPosition = positionsB[3];
     first.delaySamples = lineA.delay (n - 1);
     second.delaySamples = lineB.delay (n - 1);
     first.feedback = lineA.feedback (n - 1);

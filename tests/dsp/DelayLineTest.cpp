@@ -285,7 +285,7 @@ TEST (DelayLine, PairMatchesOneLineAfterTheOther)
 
         for (auto* line : { &pairA, &pairB, &soloA, &soloB })
         {
-            line->setBaseDelay (333.0f);
+            line->setBaseDelay (333.5f); // reads the buffer end's mirror of slot 0 early on
             line->setBaseFeedback (0.7f);
         }
 
