@@ -267,7 +267,7 @@ void Engine::takeInputs (float* const* samples, int offset, int n) noexcept
 // Envelopes, LFOs and glides of every channel in one loop. The envelopes' sample-to-sample
 // chain is the slow part: the four followers (lane 2 * channel + index) share one chain, and
 // the four LFOs run side by side in the same lanes next to it.
-template <int inUse, bool lfosRead, bool moving>
+template <int inUse, bool lfosRead, bool moving, bool anyHolding>
 void Engine::runSources (int n) noexcept
 {
     using namespace simd;
@@ -312,7 +312,7 @@ void Engine::runSources (int n) noexcept
         envelope = EnvelopeFollower::follow (magnitude, envelope, attackGain, attackCoefficient, releaseGain, releaseCoefficient);
         store (scratch.envelopes + 4 * j, envelope);
 
-        const auto index = Lfo::tick (lfoLanes);
+        const auto index = Lfo::tick<anyHolding> (lfoLanes);
 
         if constexpr (lfosRead)
             store (scratch.lfos + 4 * j, Float4 { table[0][index[0]], table[1][index[1]], table[2][index[2]], table[3][index[3]] });
@@ -409,10 +409,15 @@ void Engine::processChunk (float* const* samples, int offset, int n) noexcept
 {
     takeInputs (samples, offset, n);
 
-    // Only a modulation needs the LFOs' values; their phases move regardless.
+    // Only a modulation needs the LFOs' values; their phases move regardless, and
+    // "Sample & Hold" keeps counting its cycles.
+    const auto anyHolding = channels[0].lfo[0].getWave() == Lfo::sampleAndHold || channels[0].lfo[1].getWave() == Lfo::sampleAndHold;
+
     withChoice<2> (channelsInUse - 1, [&] (auto inUseLess1) {
         withFlag (sourceRead[2] || sourceRead[3], [&] (auto lfosRead) {
-            withFlag (gliding, [&] (auto moving) { runSources<inUseLess1 + 1, lfosRead, moving> (n); });
+            withFlag (gliding, [&] (auto moving) {
+                withFlag (anyHolding, [&] (auto holding) { runSources<inUseLess1 + 1, lfosRead, moving, holding> (n); });
+            });
         });
     });
 

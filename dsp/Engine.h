@@ -153,7 +153,7 @@ private:
 
     void takeInputs (float* const* samples, int offset, int n) noexcept;
 
-    template <int channelsInUse, bool lfosRead, bool gliding>
+    template <int channelsInUse, bool lfosRead, bool gliding, bool anyHolding>
     void runSources (int n) noexcept;
 
     template <int wetKind, int shaper>

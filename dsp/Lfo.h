@@ -80,7 +80,9 @@ public:
 
     // tick's steps for four oscillators at once: the phases and the "Sample & Hold" cycle
     // counts move exactly as tick moves them. Returns each lane's table index: the hold
-    // position in holding lanes, the point before the step in the others.
+    // position in holding lanes, the point before the step in the others. anyHolding false
+    // promises that no lane holds.
+    template <bool anyHolding>
     static simd::Int4 tick (Lanes& l) noexcept
     {
         using namespace simd;
@@ -88,9 +90,12 @@ public:
         const auto i = truncate (l.phase);
         l.phase += l.phaseIncrement;
         l.phase -= select (l.phase >= size, size, splat (0.0f));
-        l.holdIndex = (l.holdIndex - ((i < l.lastIndex) & l.holding)) & (tableSize - 1);
+
+        if constexpr (anyHolding)
+            l.holdIndex = (l.holdIndex - ((i < l.lastIndex) & l.holding)) & (tableSize - 1);
+
         l.lastIndex = i;
-        return select (l.holding, l.holdIndex, i);
+        return anyHolding ? select (l.holding, l.holdIndex, i) : i;
     }
 
     Motion& getMotion() noexcept { return motion; }
