@@ -1,10 +1,13 @@
 // The shipped LV2 bundle through lilv, the library most Linux LV2 hosts use: it is
 // found under its URI, instantiated with the features it requires and run on audio.
 
+#include "StateChunkFixture.h"
+
 #include <lilv/lilv.h>
 #include <lv2/atom/atom.h>
 #include <lv2/buf-size/buf-size.h>
 #include <lv2/options/options.h>
+#include <lv2/state/state.h>
 #include <lv2/urid/urid.h>
 
 #include <gtest/gtest.h>
@@ -139,6 +142,58 @@ protected:
         }
     }
 
+    // The plug-in's state through its LV2 state interface: JUCE keeps the host
+    // state chunk as base64 text under one key.
+    struct StateStore
+    {
+        std::map<LV2_URID, std::string> values;
+        LV2_URID stringType = 0;
+
+        static LV2_State_Status store (LV2_State_Handle handle, uint32_t key, const void* value, size_t size,
+                                       uint32_t, uint32_t)
+        {
+            static_cast<StateStore*> (handle)->values[key] = std::string (static_cast<const char*> (value), size);
+            return LV2_STATE_SUCCESS;
+        }
+
+        static const void* retrieve (LV2_State_Handle handle, uint32_t key, size_t* size, uint32_t* type, uint32_t* flags)
+        {
+            auto* self = static_cast<StateStore*> (handle);
+            const auto found = self->values.find (key);
+            if (found == self->values.end())
+                return nullptr;
+            *size = found->second.size();
+            *type = self->stringType;
+            *flags = LV2_STATE_IS_POD | LV2_STATE_IS_PORTABLE;
+            return found->second.data();
+        }
+    };
+
+    const LV2_State_Interface* stateInterface()
+    {
+        return static_cast<const LV2_State_Interface*> (lilv_instance_get_extension_data (instance, LV2_STATE__interface));
+    }
+
+    juce::MemoryBlock saveChunk()
+    {
+        StateStore store;
+        stateInterface()->save (lilv_instance_get_handle (instance), StateStore::store, &store, 0, nullptr);
+        juce::MemoryBlock chunk;
+        if (store.values.size() == 1)
+            chunk.fromBase64Encoding (juce::String::fromUTF8 (store.values.begin()->second.c_str()));
+        return chunk;
+    }
+
+    void restoreChunk (const juce::MemoryBlock& chunk)
+    {
+        StateStore store;
+        store.stringType = UridMap::map (&urids, LV2_ATOM__String);
+        const auto key = UridMap::map (&urids, (std::string (VELTRANE_LV2_URI) + ":StateString").c_str());
+        const auto text = chunk.toBase64Encoding();
+        store.values[key] = std::string (text.toRawUTF8()) + '\0';
+        stateInterface()->restore (lilv_instance_get_handle (instance), StateStore::retrieve, &store, 0, nullptr);
+    }
+
     LilvWorld* world = nullptr;
     const LilvPlugin* plugin = nullptr;
     LilvInstance* instance = nullptr;
@@ -196,4 +251,25 @@ TEST_F (Lv2Host, ProcessesStereoAudio)
 
     lilv_instance_deactivate (instance);
     EXPECT_GT (energy, 0.1);
+}
+
+TEST_F (Lv2Host, StateChunkRestoresThroughTheStateInterface)
+{
+    using veltrane::test::StateChunkFixture;
+    instantiate();
+    ASSERT_NE (stateInterface(), nullptr);
+
+    // The identifiers, in index order, as the plug-in's own state names them.
+    const auto fresh = saveChunk();
+    const auto freshXml = juce::AudioProcessor::getXmlFromBinary (fresh.getData(), (int) fresh.getSize());
+    ASSERT_NE (freshXml, nullptr);
+    juce::StringArray identifiers;
+    for (int i = 0; i < freshXml->getNumAttributes(); ++i)
+        if (const auto name = freshXml->getAttributeName (i); name != "PresetName" && ! name.endsWith ("CC"))
+            identifiers.add (name);
+    ASSERT_EQ (identifiers.size(), StateChunkFixture::numParameters);
+
+    const auto chunk = StateChunkFixture::makeChunk (identifiers);
+    restoreChunk (chunk);
+    EXPECT_EQ (saveChunk(), chunk);
 }
