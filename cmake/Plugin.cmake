@@ -58,6 +58,7 @@ target_compile_definitions (Veltrane_VST3 PRIVATE JUCE_FORCE_USE_LEGACY_PARAM_ID
 target_link_libraries (Veltrane
     PRIVATE
         juce::juce_audio_utils
+        veltrane_dsp
     PUBLIC
         juce::juce_recommended_config_flags
         juce::juce_recommended_warning_flags)

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "PluginParameter.h"
+#include "../dsp/Engine.h"
 #include "../persistence/PresetLibrary.h"
 
 #include <juce_audio_processors/juce_audio_processors.h>
@@ -126,6 +127,9 @@ public:
     float lastEditorWidth = 1000.0f;
     float lastEditorHeight = 500.0f;
 
+    // The signal path, for inspection (tests, editor displays); processBlock drives it.
+    const Engine& getEngine() const noexcept { return engine; }
+
 private:
     // The preset numbered presetToLoad, at a block start; clears presetLoadPending
     // once served and keeps it set when the preset lock is busy. Audio thread.
@@ -136,6 +140,9 @@ private:
     void closePersistentState();
 
     std::array<PluginParameter, Param::count> parameters;
+    // Two channels of delay lines, envelope followers and LFOs; each LFO's "Sample & Hold"
+    // table is drawn from its own randomly seeded generator.
+    Engine engine { (uint64_t) juce::Random().nextInt64() };
     juce::Random randomiser;
     std::atomic<int> lastParameterIndex { -1 };   // -1 until a parameter is set
 
