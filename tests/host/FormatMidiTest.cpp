@@ -25,11 +25,19 @@ std::unique_ptr<juce::AudioPluginInstance> load (Format format)
     return plugin;
 }
 
-// Default values and no controller but for those given.
-juce::MemoryBlock chunkWith (juce::AudioPluginInstance& plugin, const std::map<juce::String, double>& values,
+// The plug-in's current values (its defaults, on a fresh instance) but for those
+// given, and no controller but those given.
+juce::MemoryBlock chunkWith (Format format, juce::AudioPluginInstance& plugin, const std::map<juce::String, double>& values,
                              const std::map<juce::String, int>& controllers)
 {
-    return StateChunkFixture::makeChunk (identifiersOf (plugin), values, controllers, "Init", defaultsOf (plugin));
+    const auto current = parseStateChunk (getChunk (format, plugin));
+    const auto identifiers = identifiersOf (plugin);
+    juce::Array<float> currentValues;
+
+    for (const auto& id : identifiers)
+        currentValues.add ((float) current->getDoubleAttribute (id));
+
+    return StateChunkFixture::makeChunk (identifiers, values, controllers, "Init", currentValues);
 }
 
 std::unique_ptr<juce::XmlElement> getState (Format format, juce::AudioPluginInstance& plugin)
@@ -73,7 +81,7 @@ TEST_P (FormatMidi, LearnedControllerDrivesItsParameter)
 {
     auto plugin = load (GetParam());
     ASSERT_NE (plugin, nullptr);
-    setChunk (GetParam(), *plugin, chunkWith (*plugin, {}, { { "DryWet", 74 } }));
+    setChunk (GetParam(), *plugin, chunkWith (GetParam(), *plugin, {}, { { "DryWet", 74 } }));
 
     runBlocks (*plugin, 2, [] (juce::MidiBuffer& midi, int block) {
         if (block == 0)
@@ -107,6 +115,45 @@ TEST_P (FormatMidi, ProgramChangeLoadsAPresetAtTheNextBlock)
 
     EXPECT_EQ (state->getStringAttribute ("PresetName"), "Quiet");
     EXPECT_EQ (state->getDoubleAttribute ("DryWet"), 0.25);
+}
+
+TEST_P (FormatMidi, NoteOnChannelOneRestartsLfo1)
+{
+    // LFO 1, a slow rising saw, swings Delay 1's time fully: restarting it moves
+    // the echoes, so a restart shows as a different output from the same input.
+    auto settings = [this] (juce::AudioPluginInstance& plugin) {
+        return chunkWith (GetParam(), plugin,
+                          { { "Delay1TimeMod", 1.0 }, { "Delay1TimeModSource", 0.84 }, { "LFO1Wave", 0.4 },
+                            { "LFO1Rate", 0.1 }, { "MixMode", 0.5 } },
+                          {});
+    };
+
+    auto plain = load (GetParam());
+    auto restarted = load (GetParam());
+    ASSERT_NE (plain, nullptr);
+    ASSERT_NE (restarted, nullptr);
+    setChunk (GetParam(), *plain, settings (*plain));
+    setChunk (GetParam(), *restarted, settings (*restarted));
+
+    const auto noteAt = [] (int noteChannel) {
+        return [noteChannel] (juce::MidiBuffer& midi, int block) {
+            if (block == 30)
+                midi.addEvent (juce::MidiMessage::noteOn (noteChannel, 60, (juce::uint8) 100), 100);
+        };
+    };
+
+    const auto reference = runBlocks (*plain, 60, [] (juce::MidiBuffer&, int) {});
+    const auto withNote = runBlocks (*restarted, 60, noteAt (1));
+
+    // Identical up to the note, different after it.
+    for (int j = 0; j < 30 * 512; ++j)
+        ASSERT_EQ (reference.getSample (0, j), withNote.getSample (0, j)) << j;
+
+    float difference = 0.0f;
+    for (int j = 30 * 512; j < reference.getNumSamples(); ++j)
+        difference = std::max (difference, std::abs (reference.getSample (0, j) - withNote.getSample (0, j)));
+
+    EXPECT_GT (difference, 0.01f);
 }
 
 INSTANTIATE_TEST_SUITE_P (Formats, FormatMidi, ::testing::Values (Format::vst2, Format::vst3),

@@ -161,7 +161,7 @@ TEST (HostLifecycle, OddTransports)
     for (auto index : { 2, 4, 9, 11 })
         parameters[index]->setValueNotifyingHost (1.0f);
     for (auto index : { 3, 10 })
-        parameters[index]->setValueNotifyingHost (5.0f / 6.0f);
+        parameters[index]->setValueNotifyingHost (0.84f);   // "LFO 1"
     for (auto index : { 5, 12 })
         parameters[index]->setValueNotifyingHost (1.0f);
 

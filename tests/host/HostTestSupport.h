@@ -126,10 +126,11 @@ struct StateChunkFixture
         return makeChunk (identifiers, values, controllers, "Formats & \"Friends\"");
     }
 
-    // Values default to 'defaults' (normalised, in identifier order); controllers to -1.
+    // Values not given are taken from 'others' (normalised, in identifier order);
+    // controllers not given are -1.
     static juce::MemoryBlock makeChunk (const juce::StringArray& identifiers, const std::map<juce::String, double>& values,
                                         const std::map<juce::String, int>& controllers, const juce::String& presetName,
-                                        const juce::Array<float>& defaults = {})
+                                        const juce::Array<float>& others = {})
     {
         juce::XmlElement state ("VELTRANE_STATE");
         state.setAttribute ("PresetName", presetName);
@@ -137,7 +138,7 @@ struct StateChunkFixture
         for (int i = 0; i < identifiers.size(); ++i)
         {
             const auto& id = identifiers[i];
-            const auto value = values.count (id) != 0 ? values.at (id) : (double) defaults[i];
+            const auto value = values.count (id) != 0 ? values.at (id) : (double) others[i];
             state.setAttribute (id, juce::String::formatted ("%.9g", value));
             state.setAttribute (id + "CC", controllers.count (id) != 0 ? controllers.at (id) : -1);
         }
@@ -152,14 +153,6 @@ inline juce::StringArray identifiersOf (juce::AudioPluginInstance& plugin)
     for (int i = 0; i < StateChunkFixture::numParameters; ++i)
         identifiers.add (plugin.getParameters()[i]->getName (64));
     return identifiers;
-}
-
-inline juce::Array<float> defaultsOf (juce::AudioPluginInstance& plugin)
-{
-    juce::Array<float> defaults;
-    for (int i = 0; i < StateChunkFixture::numParameters; ++i)
-        defaults.add (plugin.getParameters()[i]->getDefaultValue());
-    return defaults;
 }
 
 } // namespace veltrane::test
