@@ -1,5 +1,7 @@
 #include "DelayLine.h"
 
+#include "StaticDispatch.h"
+
 #include <algorithm>
 #include <cmath>
 #include <limits>
@@ -143,15 +145,6 @@ namespace
             }
         }
     };
-
-    template <typename Fn>
-    void withFlag (bool flag, Fn&& fn)
-    {
-        if (flag)
-            fn (std::true_type {});
-        else
-            fn (std::false_type {});
-    }
 }
 
 void DelayLine::process (const float* input, const float* delays, const float* feedbacks, float* output, int n) noexcept

@@ -1,6 +1,7 @@
 #include "Engine.h"
 
 #include "SeededRandom.h"
+#include "StaticDispatch.h"
 
 #include <algorithm>
 #include <cmath>
@@ -44,30 +45,6 @@ namespace
     }
 
     bool isFiniteSample (float x) noexcept { return std::fabs (x) <= std::numeric_limits<float>::max(); }
-
-    // Calls fn with a compile-time copy of flag (or of choice, 0 <= choice < count), so that a
-    // setting fixed for the block picks a specialised loop instead of being tested on every
-    // sample.
-    template <typename Fn>
-    void withFlag (bool flag, Fn&& fn)
-    {
-        if (flag)
-            fn (std::true_type {});
-        else
-            fn (std::false_type {});
-    }
-
-    template <int count, int first = 0, typename Fn>
-    void withChoice (int choice, Fn&& fn)
-    {
-        if constexpr (first + 1 < count)
-        {
-            if (choice != first)
-                return withChoice<count, first + 1> (choice, std::forward<Fn> (fn));
-        }
-
-        fn (std::integral_constant<int, first> {});
-    }
 }
 
 Engine::Engine (uint64_t seed) : Engine (lfoSeedsFrom (seed)) {}

@@ -58,7 +58,10 @@ public:
     void getStateInformation (juce::MemoryBlock& destData) override;
     void setStateInformation (const void* data, int sizeInBytes) override;
 
-    // Indexed parameter operations; index is 0..32.
+    // Indexed parameter operations; index is 0..32. (JUCE's overloads with a maximum
+    // length stay visible and end up here.)
+    using juce::AudioProcessor::getParameterName;
+    using juce::AudioProcessor::getParameterText;
     int getNumParameters() override { return Param::count; }
     const juce::String getParameterName (int index) override;
     float getParameter (int index) override;

@@ -213,3 +213,30 @@ TEST (HostLifecycle, MidiOfEveryKindOnEveryChannel)
 
     EXPECT_LT (peak, 20.0f);
 }
+
+TEST (HostLifecycle, AbsurdRatesAndNonFiniteInputThroughTheBinary)
+{
+    auto plugin = loadVst2();
+    ASSERT_NE (plugin, nullptr);
+
+    // Rates no engine can use keep the previous one: nothing crashes, nothing
+    // allocates gigabytes, and the output stays finite.
+    for (auto rate : { 0.0, -44100.0, std::numeric_limits<double>::quiet_NaN(), 1.0e12, 44100.0 })
+    {
+        plugin->prepareToPlay (rate, 512);
+        EXPECT_LT (runBlocks (*plugin, 2, 512, 4), 10.0f) << rate;
+    }
+
+    // Non-finite samples in one block do not poison the lines or followers for
+    // the blocks after it.
+    plugin->getParameters()[1]->setValueNotifyingHost (1.0f);   // Delay 1 feedback 100 %
+    juce::AudioBuffer<float> poisoned (2, 512);
+    juce::MidiBuffer midi;
+    poisoned.clear();
+    poisoned.setSample (0, 10, std::numeric_limits<float>::quiet_NaN());
+    poisoned.setSample (1, 20, std::numeric_limits<float>::infinity());
+    poisoned.setSample (0, 30, -std::numeric_limits<float>::infinity());
+    plugin->processBlock (poisoned, midi);
+
+    EXPECT_LT (runBlocks (*plugin, 2, 512, 40), 50.0f);
+}
