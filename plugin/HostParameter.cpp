@@ -5,11 +5,11 @@
 namespace veltrane
 {
 
-HostParameter::HostParameter (VeltraneAudioProcessor& owner, int parameterIndex)
-    : juce::AudioProcessorParameterWithID (juce::ParameterID (parameterTable[(size_t) parameterIndex].identifier, 1),
-                                           parameterTable[(size_t) parameterIndex].identifier),
+HostParameter::HostParameter (VeltraneAudioProcessor& owner, int tableIndex)
+    : juce::AudioProcessorParameterWithID (juce::ParameterID (parameterTable[(size_t) tableIndex].identifier, 1),
+                                           parameterTable[(size_t) tableIndex].identifier),
       processor (owner),
-      index (parameterIndex)
+      index (tableIndex)
 {
 }
 

@@ -17,7 +17,7 @@ class VeltraneAudioProcessor;
 class HostParameter final : public juce::AudioProcessorParameterWithID
 {
 public:
-    HostParameter (VeltraneAudioProcessor& owner, int index);
+    HostParameter (VeltraneAudioProcessor& owner, int tableIndex);
 
     float getValue() const override;
     void setValue (float newValue) override;

@@ -310,7 +310,9 @@ TEST (Logo, DrawsInsideItsSquareAndNothingAtZeroSize)
                 continue;
             EXPECT_TRUE (y >= 6 && y < 58) << x << ", " << y;   // bars span 0.1 H to 0.9 H
             if (c.getAlpha() == 255)
+            {
                 EXPECT_EQ (c, accent);
+            }
             ++orange;
         }
     EXPECT_GT (orange, 300);

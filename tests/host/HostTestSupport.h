@@ -33,9 +33,17 @@ inline std::unique_ptr<juce::AudioPluginInstance> loadPlugin (Format format, dou
     return pluginFormat.createInstanceFromDescription (*descriptions[0], sampleRate, blockSize, error);
 }
 
+// The VST 2.4 effect behind a plug-in JUCE's VST2 hosting loaded.
 inline Vst2::AEffect* effectOf (juce::AudioPluginInstance& plugin)
 {
-    return static_cast<Vst2::AEffect*> (plugin.getPlatformSpecificData());
+    struct Visitor final : juce::ExtensionsVisitor
+    {
+        void visitVSTClient (const VSTClient& client) override { effect = reinterpret_cast<Vst2::AEffect*> (client.getAEffectPtr()); }
+        Vst2::AEffect* effect = nullptr;
+    } visitor;
+
+    plugin.getExtensions (visitor);
+    return visitor.effect;
 }
 
 // "VC2!", the text's length, the one-line text, a zero byte: the plug-in's chunk.

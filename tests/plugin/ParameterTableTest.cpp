@@ -210,7 +210,9 @@ TEST (Randomize, DrawsTwentyFiveParametersFromTheSeededGenerator)
         if (! isRandomized (i))
         {
             if (i != Param::Randomize)
+            {
                 EXPECT_EQ (processor.getParameter (i), before[(size_t) i]) << processor.getParameterName (i);
+            }
             continue;
         }
 

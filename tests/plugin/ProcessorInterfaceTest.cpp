@@ -91,7 +91,9 @@ TEST (Processor, HostParametersMirrorTheTable)
         EXPECT_FALSE (parameter->isMetaParameter());
 
         if (record.isDiscrete)
+        {
             EXPECT_EQ (parameter->getNumSteps(), record.numChoices());
+        }
     }
 
     auto* time = hostParameters[Param::Delay1Time];
