@@ -34,7 +34,7 @@ namespace Choices
 
 using L = Law;
 
-const std::array<ParameterSpec, Param::count> parameterTable {{
+const std::array<ParameterRow, Param::count> parameterTable {{
     // identifier                 label  min    max     default law          choices
     { "Delay1Time",               "Ms",  1.0f,  2000.0f, 120.0f, L::square,   nullptr },
     { "Delay1Feedback",           "%",   0.0f,  100.0f,  40.0f,  L::straight, nullptr },

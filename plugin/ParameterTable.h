@@ -46,7 +46,7 @@ namespace Choices
 
 // One row of the parameter table. Discrete parameters run from 0 to count - 1 with
 // the straight law; their choice list gives the texts.
-struct ParameterSpec
+struct ParameterRow
 {
     const char* identifier;
     const char* label;
@@ -57,7 +57,7 @@ struct ParameterSpec
     const ChoiceList* choices;   // null for continuous parameters
 };
 
-extern const std::array<ParameterSpec, Param::count> parameterTable;
+extern const std::array<ParameterRow, Param::count> parameterTable;
 
 // Parameters that Randomize leaves alone: both gains, the dry/wet balance, the
 // waveshaper and its amount, Randomize itself and the two sync switches.

@@ -5,19 +5,19 @@
 namespace veltrane
 {
 
-void PluginParameter::initialise (const ParameterSpec& spec)
+void PluginParameter::initialise (const ParameterRow& row)
 {
-    minimum = spec.minimum;
-    maximum = spec.maximum;
-    isDiscrete = spec.choices != nullptr;
-    choices = spec.choices;
-    name = spec.identifier;
-    label = spec.label;
-    isSkewed = spec.law != Law::straight;
-    rootSkew = spec.law == Law::root;
+    minimum = row.minimum;
+    maximum = row.maximum;
+    isDiscrete = row.choices != nullptr;
+    choices = row.choices;
+    name = row.identifier;
+    label = row.label;
+    isSkewed = row.law != Law::straight;
+    rootSkew = row.law == Law::root;
 
-    if (minimum <= spec.defaultPhysical && spec.defaultPhysical <= maximum)
-        defaultValue = physicalToNormalised (spec.defaultPhysical);
+    if (minimum <= row.defaultPhysical && row.defaultPhysical <= maximum)
+        defaultValue = physicalToNormalised (row.defaultPhysical);
 
     value.exchange (defaultValue);
     currentValue.store (value.load());

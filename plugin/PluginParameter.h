@@ -30,7 +30,7 @@ struct PluginParameter
     const ChoiceList* choices = nullptr;
 
     // Takes bounds, law and texts from a table row and sets the value to the default.
-    void initialise (const ParameterSpec& spec);
+    void initialise (const ParameterRow& row);
 
     // Stores a normalised value in [0, 1]; anything else (NaN included) is ignored.
     // Returns whether the value was taken.

@@ -16,7 +16,7 @@ check() { # description, command...
 for ttl in "$bundle"/*.ttl; do
     check "$(basename "$ttl") parses as Turtle" serdi -q -i turtle -o ntriples "$ttl"
 done
-# Validated against the LV2 specification's own schemas that Debian installs.
+# Validated against the LV2 schemas that Debian installs (lv2-dev).
 # JUCE 7 writes three kinds of statement the schemas do not foresee, all read by
 # hosts as intended: port properties (enumeration, toggled) on its patch
 # parameters, doap:release and doap:maintainer on the plug-in, and the UI named
