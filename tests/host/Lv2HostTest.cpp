@@ -329,4 +329,8 @@ TEST_F (Lv2Host, MidiReachesLearnedControllersAndProgramChanges)
     EXPECT_EQ (state->getIntAttribute ("DryWetCC"), 74);
     EXPECT_EQ (state->getStringAttribute ("PresetName"), "Quiet");
     EXPECT_EQ (state->getDoubleAttribute ("WaveshaperAmount"), 0.75);
+
+    // The instance writes its preferences when it goes: while this test's HOME exists.
+    lilv_instance_free (instance);
+    instance = nullptr;
 }

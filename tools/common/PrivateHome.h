@@ -1,7 +1,9 @@
 #pragma once
 
+#include <array>
 #include <cstdlib>
 #include <filesystem>
+#include <optional>
 #include <string>
 
 #include <unistd.h>
@@ -9,39 +11,67 @@
 namespace veltrane::tools
 {
 
-// The plug-in reads and writes the user's preferences (window size, MIDI bindings)
-// when an instance opens and closes. The tools run instances of their own, so they
-// point HOME and the XDG user folders at a private temporary folder for their whole
-// run and leave the user's files alone.
+// Points HOME and the XDG user folders at a fresh temporary folder for its lifetime,
+// then puts them back and removes the folder. The plug-in reads and writes the
+// user's preferences and presets when an instance opens and closes; the tools and
+// tests run instances of their own and must leave the user's files alone.
 class PrivateHome
 {
 public:
     PrivateHome()
     {
-        std::string pattern = (std::filesystem::temp_directory_path() / "veltrane-tool-XXXXXX").string();
+        std::string pattern = (std::filesystem::temp_directory_path() / "veltrane-home-XXXXXX").string();
 
         if (::mkdtemp (pattern.data()) == nullptr)
             return;
 
         folder = pattern;
-        ::setenv ("HOME", folder.c_str(), 1);
-        ::setenv ("XDG_CONFIG_HOME", (folder + "/.config").c_str(), 1);
-        ::setenv ("XDG_DATA_HOME", (folder + "/.local/share").c_str(), 1);
-        ::setenv ("XDG_CACHE_HOME", (folder + "/.cache").c_str(), 1);
+
+        for (size_t i = 0; i < variables.size(); ++i)
+        {
+            if (const auto* value = std::getenv (variables[i].name))
+                previous[i] = value;
+
+            ::setenv (variables[i].name, (folder + variables[i].below).c_str(), 1);
+        }
     }
 
     ~PrivateHome()
     {
+        if (folder.empty())
+            return;
+
+        for (size_t i = 0; i < variables.size(); ++i)
+        {
+            if (previous[i])
+                ::setenv (variables[i].name, previous[i]->c_str(), 1);
+            else
+                ::unsetenv (variables[i].name);
+        }
+
         std::error_code ignored;
-        if (! folder.empty())
-            std::filesystem::remove_all (folder, ignored);
+        std::filesystem::remove_all (folder, ignored);
     }
+
+    const std::string& path() const noexcept { return folder; }
 
     PrivateHome (const PrivateHome&) = delete;
     PrivateHome& operator= (const PrivateHome&) = delete;
 
 private:
+    struct Variable
+    {
+        const char* name;
+        const char* below;   // the folder the variable names, below the private home
+    };
+
+    static constexpr std::array<Variable, 4> variables { { { "HOME", "" },
+                                                           { "XDG_CONFIG_HOME", "/.config" },
+                                                           { "XDG_DATA_HOME", "/.local/share" },
+                                                           { "XDG_CACHE_HOME", "/.cache" } } };
+
     std::string folder;
+    std::array<std::optional<std::string>, 4> previous;
 };
 
 } // namespace veltrane::tools
