@@ -24,10 +24,10 @@ target_sources (Veltrane PRIVATE
     plugin/PluginParameter.cpp
     plugin/HostParameter.cpp
     plugin/VeltraneAudioProcessor.cpp
-    dsp/ProcessorBlock.cpp
+    plugin/ProcessorBlock.cpp
+    plugin/ProcessorPersistence.cpp
     persistence/Preferences.cpp
     persistence/PresetLibrary.cpp
-    persistence/ProcessorPersistence.cpp
     persistence/SafeXml.cpp
     persistence/StateChunk.cpp
     editor/PanelLayout.cpp

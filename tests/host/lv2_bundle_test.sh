@@ -16,13 +16,14 @@ check() { # description, command...
 for ttl in "$bundle"/*.ttl; do
     check "$(basename "$ttl") parses as Turtle" serdi -q -i turtle -o ntriples "$ttl"
 done
-# Validated against the LV2 schemas that Debian installs (lv2-dev).
+# Validated against the LV2 specification's own bundles (those of Debian's lv2-dev),
+# never against whatever other plug-ins are installed beside them.
 # JUCE 7 writes three kinds of statement the schemas do not foresee, all read by
 # hosts as intended: port properties (enumeration, toggled) on its patch
 # parameters, doap:release and doap:maintainer on the plug-in, and the UI named
 # among the plug-in's features. Every other finding fails the test.
 validate() {
-    sord_validate $(find /usr/lib/lv2 -name '*.ttl') "$bundle"/*.ttl > "$work/validate.txt" 2>&1
+    sord_validate $(dpkg -L lv2-dev | grep '^/usr/lib/lv2/.*\.ttl$') "$bundle"/*.ttl > "$work/validate.txt" 2>&1
     grep -A3 '^error' "$work/validate.txt" | grep -v '^--' | paste - - - - \
         | grep -v -E "Subject not in domain <http://lv2plug.in/ns/lv2core#Port>.*lv2core#portProperty" \
         | grep -v -E "Subject not in domain <http://usefulinc.com/ns/doap#Project>.*doap#(release|maintainer)" \

@@ -1,7 +1,7 @@
-#include "../plugin/VeltraneAudioProcessor.h"
+#include "VeltraneAudioProcessor.h"
 
-#include "Preferences.h"
-#include "StateChunk.h"
+#include "../persistence/Preferences.h"
+#include "../persistence/StateChunk.h"
 
 namespace veltrane
 {

@@ -1,4 +1,4 @@
-#include "../plugin/VeltraneAudioProcessor.h"
+#include "VeltraneAudioProcessor.h"
 
 #include <algorithm>
 
