@@ -1,5 +1,5 @@
 // The optimised engine against the plain reference model, scenario by scenario, bit for bit (a
-// few units in the last place for "Dirt"). Both draw their "Sample & Hold" tables from one seed.
+// few units in the last place for "Dirt"), with the same seed for the "Sample & Hold" tables.
 
 #include "ReferenceScenarios.h"
 
@@ -11,14 +11,12 @@ namespace
 {
 constexpr uint64_t seed = 0x5eed1234abcdull;
 
-// The engine driven the way the processor drives it: the knobs once per block, the block split
-// where a note restarts an LFO.
+// Driven as the processor drives it: the knobs once per block, the block split where a note
+// restarts an LFO.
 Audio engineRun (const Scenario& s)
 {
     veltrane::Engine engine (seed);
     engine.prepare (s.sampleRate);
-    const float tempo = tempoOf (s.tempo.hasPosition, s.tempo.hasTempo, s.tempo.bpm);
-
     return run (s, [&] (const float* values, float* const* io, int n, const std::vector<Midi>& events) {
         const auto k = knobsFrom (values);
         veltrane::EngineSettings settings;
@@ -30,13 +28,12 @@ Audio engineRun (const Scenario& s)
             settings.lfo[u] = { k.lfo[u].wave, k.lfo[u].rateHz, k.lfo[u].sync, k.lfo[u].division };
         }
         settings.mixMode = k.mixMode, settings.dryWet = k.dryWet, settings.shaper = k.shaper, settings.shaperAmount = k.amount;
-        settings.tempoBpm = tempo;
+        settings.tempoBpm = tempoOf (s.tempo.hasPosition, s.tempo.hasTempo, s.tempo.bpm);
 
-        bool restarted[2] = { false, false };
+        bool restarted[2] { false, false };
         for (const auto& e : events)
             if (e.position < n && restartedLfo (e) >= 0)
                 restarted[restartedLfo (e)] = true;
-
         engine.beginBlock (settings, s.channels, n, restarted);
         int done = 0;
         for (const auto& e : events)
@@ -46,20 +43,17 @@ Audio engineRun (const Scenario& s)
     });
 }
 
-// Bits of the units that the output must depend on: the delays heard (0, 1) and the sources their
-// modulations read (2..5: envelope 1, 2, LFO 1, 2).
+// The units the output must depend on: bits 0, 1 the delays heard, bits 2..5 the sources their
+// modulations read (envelope 1, 2, LFO 1, 2).
 unsigned unitsHeard (const Scenario& s)
 {
-    const auto k = initialKnobs (s);
+    const auto k = knobsFrom (s.values().data());
     const bool mono = s.channels == 1;
-    const unsigned delaysHeard[7] = { 3, 3, 3, 1, 2, mono ? 1u : 3u, mono ? 2u : 3u };
-    unsigned units = delaysHeard[k.mixMode];
-    auto unitOf = [] (int source) { return source <= 4 ? 2 + (source - 1) / 2 : source - 1; };
-
+    unsigned units = std::vector<unsigned> { 3, 3, 3, 1, 2, mono ? 1u : 3u, mono ? 2u : 3u }[(size_t) k.mixMode];
     for (int u = 0; u < 2; ++u)
         for (auto [source, depth] : { std::pair (k.delay[u].timeSource, k.delay[u].timeDepth), std::pair (k.delay[u].feedbackSource, k.delay[u].feedbackDepth) })
             if ((units >> u & 1) != 0 && source != 0 && depth != 0.0f)
-                units |= 1u << unitOf (source);
+                units |= 1u << (source <= 4 ? 2 + (source - 1) / 2 : source - 1);
     return units;
 }
 
@@ -79,4 +73,3 @@ TEST_P (EngineMatchesReference, SampleBySample)
 }
 
 INSTANTIATE_TEST_SUITE_P (EveryScenario, EngineMatchesReference, ::testing::ValuesIn (scenarios()), nameOf);
-

@@ -1,7 +1,7 @@
-// The processor's audio path written plainly from its description, one sample of one channel at
-// a time, in the precisions the description states. It includes nothing of the product (only the
-// standard library), so the engine and the shipped binary can be checked against it without
-// sharing a fault with it.
+// The processor's audio path written plainly from its description: one sample of one channel at a
+// time, in the precisions the description states. It includes nothing of the product (only the
+// standard library), so the engine and the shipped binary are checked against code that cannot
+// share their faults.
 #pragma once
 
 #include <algorithm>
@@ -12,7 +12,7 @@
 
 namespace reference
 {
-// physical = minimum + (maximum - minimum) * law (normalised), per parameter index.
+// physical = minimum + (maximum - minimum) * law (normalised), by parameter index.
 enum Law { straight, square, root };
 struct Range { float minimum, maximum; Law law; };
 inline constexpr Range ranges[33] {
@@ -20,8 +20,7 @@ inline constexpr Range ranges[33] {
     { 1, 2000, square }, { 0, 100, straight }, { 0, 100, straight }, { 0, 6, straight }, { 0, 100, straight }, { 0, 6, straight }, { -70, 6, root },
     { 0, 6, straight }, { 0, 100, straight }, { 0, 3, straight }, { 0, 100, straight }, { 0, 1, straight },
     { -16, 6, root }, { 0, 12, square }, { 0, 12, square }, { -16, 6, root }, { 0, 12, square }, { 0, 12, square },
-    { 0, 5, straight }, { 0, 40, square }, { 0, 1, straight }, { 0, 17, straight },
-    { 0, 5, straight }, { 0, 40, square }, { 0, 1, straight }, { 0, 17, straight } };
+    { 0, 5, straight }, { 0, 40, square }, { 0, 1, straight }, { 0, 17, straight }, { 0, 5, straight }, { 0, 40, square }, { 0, 1, straight }, { 0, 17, straight } };
 
 inline float physical (int index, float v)
 {
@@ -43,7 +42,6 @@ inline Knobs knobsFrom (const float* v)
     auto p = [v] (int i) { return physical (i, v[i]); };
     auto choice = [&p] (int i) { return (int) p (i); };
     Knobs k;
-
     for (int u = 0; u < 2; ++u)
     {
         const int d = 7 * u, e = 19 + 3 * u, l = 25 + 4 * u;
@@ -51,7 +49,6 @@ inline Knobs knobsFrom (const float* v)
         k.follower[u] = { amplitude (p (e)), p (e + 1), p (e + 2) };
         k.lfo[u] = { choice (l), p (l + 1), choice (l + 2) != 0, choice (l + 3) };
     }
-
     k.mixMode = choice (14), k.dryWet = v[15], k.shaper = choice (16), k.amount = v[17];
     return k;
 }
@@ -85,7 +82,6 @@ struct Lfo
     {
         Random48 random { seed };
         const float w = (float) (6.283185307179586 / N), n = N, h = N / 2;
-
         for (int i = 0; i < N; ++i)
         {
             const float x = (float) i;
@@ -100,21 +96,16 @@ struct Lfo
 
     void set (const LfoKnobs& k, float tempo)
     {
-        static const float bars[18] = { 8, 4, 2, 1, 0.5f, 0.5f, 0.25f, 0.25f, 0.125f, 0.125f, 0.0625f, 0.0625f,
-                                        0.03125f, 0.03125f, 0.015625f, 0.015625f, 0.0078125f, 0.0078125f };
-        if (k.wave < 6)
-            wave = k.wave;
-
+        static const float bars[18] { 8, 4, 2, 1, 0.5f, 0.5f, 0.25f, 0.25f, 0.125f, 0.125f, 0.0625f, 0.0625f,
+                                      0.03125f, 0.03125f, 0.015625f, 0.015625f, 0.0078125f, 0.0078125f };
+        wave = k.wave < 6 ? k.wave : wave;
         if (! k.sync)
             frequency = k.rateHz;
         else if (k.division >= 0 && k.division <= 17)
         {
-            const float bar = 60000.0f / tempo * 4.0f;
-            frequency = 1000.0f / (bar * bars[k.division]);
-            const bool dotted = k.division >= 5 && k.division % 2 == 1;
-            frequency = dotted ? (float) (frequency * 0.75) : frequency;
+            frequency = 1000.0f / (60000.0f / tempo * 4.0f * bars[k.division]);
+            frequency = k.division >= 5 && k.division % 2 == 1 ? (float) (frequency * 0.75) : frequency; // dotted
         }
-
         increment = ((float) N / (float) sampleRate) * frequency;
     }
 
@@ -124,12 +115,11 @@ struct Lfo
     {
         const int i = (int) phase;
         phase += increment;
-        if (phase >= N)
-            phase -= N;
-        if (wave == 5 && i < lastIndex)
+        phase = phase >= N ? phase - N : phase;
+        if (wave == 5 && i < lastIndex) // wrapped
             holdIndex = (holdIndex + 1) % N;
         lastIndex = i;
-        return wave == 5 ? table[5][holdIndex] : table[wave][i];
+        return table[wave][wave == 5 ? holdIndex : i];
     }
 };
 
@@ -157,7 +147,7 @@ struct Line
     double sampleRate = 44100.0;
     int length = 88200, writeIndex = 0;
     std::vector<float> buffer = std::vector<float> (88200);
-    float delay = 4410.0f, feedback = 0.0f, baseDelay = 0.0f, baseFeedback = 0.0f; // delay in samples
+    float delay = 0.0f, feedback = 0.0f, baseDelay = 0.0f, baseFeedback = 0.0f; // delays in samples
 
     void resize (double rate)
     {
@@ -165,24 +155,18 @@ struct Line
             length = (int) (rate / sampleRate * length), buffer.assign ((size_t) length, 0.0f), writeIndex = 0, sampleRate = rate;
     }
 
-    void clear() { std::fill (buffer.begin(), buffer.end(), 0.0f), writeIndex = 0; }
-
     void setBase (float timeMs)
     {
         const float d = (float) ((float) sampleRate * (double) timeMs * 0.001), L = (float) length;
         delay = baseDelay = d > L || std::isnan (d) ? L : d <= 0.0f ? 1.0f : d;
     }
 
-    void modulateTime (float depth, float m)
+    void modulate (float timeDepth, float timeSource, float feedbackDepth, float feedbackSource)
     {
-        const float b = baseDelay, h = b > length * 0.5 ? length - b : b;
-        delay = h * depth * m + b;
-    }
-
-    void modulateFeedback (float depth, float m)
-    {
-        const float f = baseFeedback, h = f > 0.5f ? 1.0f - f : f;
-        feedback = h * depth * m + f;
+        const float b = baseDelay, f = baseFeedback;
+        const float h = b > length * 0.5 ? length - b : b, hf = f > 0.5f ? 1.0f - f : f;
+        delay = timeDepth != 0.0f ? h * timeDepth * timeSource + b : b;
+        feedback = feedbackDepth != 0.0f ? hf * feedbackDepth * feedbackSource + f : f;
     }
 
     float process (float input)
@@ -191,16 +175,13 @@ struct Line
         // position that rounds up to L after its wrap wraps again.
         const float L = (float) length, d = delay > L ? L : delay >= 0.0f ? delay : 0.0f;
         float position = (float) writeIndex - d;
-        if (position < 0.0f)
-            position += L;
-        if (position >= L)
-            position -= L;
+        position = position < 0.0f ? position + L : position;
+        position = position >= L ? position - L : position;
         const int index = (int) std::floor (position);
-        const float fraction = position - (float) index;
-        const float next = index == length - 1 ? buffer[0] : buffer[(size_t) index + 1];
-        const float out = buffer[(size_t) index] + (next - buffer[(size_t) index]) * fraction;
+        const float fraction = position - (float) index, now = buffer[(size_t) index];
+        const float out = now + ((index == length - 1 ? buffer[0] : buffer[(size_t) index + 1]) - now) * fraction;
         buffer[(size_t) writeIndex] = (float) (feedback * 0.96 * out + input);
-        writeIndex = writeIndex + 1 == length ? 0 : writeIndex + 1;
+        writeIndex = (writeIndex + 1) % length;
         return out;
     }
 };
@@ -210,13 +191,12 @@ inline float shape (float v, int shaper, float a)
     const float t = (10.0f + 390.0f * a) * v;
     return shaper == 1 ? v - v * v * v / 6.0f
          : shaper == 2 ? std::tanh ((1.0f + 9.0f * a) * v)
-         : shaper == 3 ? std::tanh (std::sin (t / std::sqrt (t * t + 1.0f)))
-                       : v;
+         : shaper == 3 ? std::tanh (std::sin (t / std::sqrt (t * t + 1.0f))) : v;
 }
 
 struct Model
 {
-    // The four LFO seeds are drawn from one seed: channel 0's LFO 1 and 2, then channel 1's.
+    // The four LFO seeds are drawn from one: channel 0's LFO 1 and 2, then channel 1's.
     explicit Model (uint64_t seed)
     {
         Random48 random { (int64_t) seed };
@@ -231,26 +211,25 @@ struct Model
     {
         const bool change = rate >= 1000.0 && rate <= 768000.0 && rate != sampleRate;
         sampleRate = change ? rate : sampleRate;
-
         for (int c = 0; c < 2; ++c)
             for (int u = 0; u < 2; ++u)
             {
                 if (change)
                     line[c][u].resize (rate), follower[c][u].sampleRate = rate, lfo (c, u).sampleRate = rate;
-                line[c][u].clear(), follower[c][u].envelope = 0.0f;
+                std::fill (line[c][u].buffer.begin(), line[c][u].buffer.end(), 0.0f);
+                line[c][u].writeIndex = 0, follower[c][u].envelope = 0.0f;
             }
     }
 
-    // values: the 33 normalised parameters; events within [0, n) are met during channel 0's pass.
+    // values: the 33 normalised parameters; events at [0, n) are met during channel 0's pass.
     void block (const float* values, float* const* io, int numChannels, int n, float tempo, const std::vector<Midi>& events)
     {
         offset = -offset;
         const Knobs k = knobsFrom (values);
         const double quarter = sampleRate * 0.25, steps = (double) numChannels * n;
-
         for (int u = 0; u < 2; ++u)
         {
-            // A block of at least twice a quarter second's steps lands on the target instead of
+            // A block of at least twice a quarter second's steps lands on the target rather than
             // swinging past it. A step too small to move the time in single precision covers the
             // rest in a straight line over the block, or, if even that is too small, snaps.
             const float distance = k.delay[u].timeMs - smoothed[u];
@@ -259,45 +238,37 @@ struct Model
                 step[u] = steps > 0.0 ? (float) (distance / steps) : 0.0f;
             if (smoothed[u] + step[u] == smoothed[u] && distance != 0.0f)
                 smoothed[u] = k.delay[u].timeMs, step[u] = 0.0f;
-
             for (int c = 0; c < 2; ++c)
             {
-                line[c][u].feedback = line[c][u].baseFeedback = k.delay[u].feedback;
+                line[c][u].baseFeedback = k.delay[u].feedback;
                 follower[c][u].set (k.follower[u].attackMs, k.follower[u].releaseMs);
                 lfo (c, u).set (k.lfo[u], tempo);
             }
         }
 
-        // Wet signal per mix mode and channel: 0 both delays, 1 Delay 1, 2 Delay 2.
-        static const int wetOf[7][2] = { { 0, 0 }, { 2, 2 }, { 1, 1 }, { 1, 1 }, { 2, 2 }, { 1, 2 }, { 2, 1 } };
+        // The delays heard per mix mode and channel: bit 0 Delay 1, bit 1 Delay 2.
+        static const int wetOf[7][2] { { 3, 3 }, { 2, 2 }, { 1, 1 }, { 1, 1 }, { 2, 2 }, { 1, 2 }, { 2, 1 } };
         auto heard = [this] (int unit, float v) { return (silenced >> unit & 1) != 0 ? 0.0f : v; };
 
         for (int c = 0; c < numChannels; ++c)
             for (int j = 0; j < n; ++j)
             {
                 const float x = std::isfinite (io[c][j]) ? io[c][j] + offset : offset;
-
                 for (const auto& e : events)
                     if (c == 0 && e.position == j && restartedLfo (e) >= 0)
                         lfo (0, restartedLfo (e)).restart(), lfo (1, restartedLfo (e)).restart();
-
                 for (int u = 0; u < 2; ++u)
                     smoothed[u] += step[u], line[c][u].setBase (smoothed[u]);
 
-                const float envelope1 = heard (2, follower[c][0].process (k.follower[0].sensitivity * x));
-                const float envelope2 = heard (3, follower[c][1].process (k.follower[1].sensitivity * x));
-                const float lfo1 = heard (4, lfo (c, 0).tick()), lfo2 = heard (5, lfo (c, 1).tick());
-                const float source[7] = { 0.0f, envelope1, -envelope1, envelope2, -envelope2, lfo1, lfo2 };
-
+                const float e1 = heard (2, follower[c][0].process (k.follower[0].sensitivity * x));
+                const float e2 = heard (3, follower[c][1].process (k.follower[1].sensitivity * x));
+                const float l1 = heard (4, lfo (c, 0).tick()), l2 = heard (5, lfo (c, 1).tick());
+                const float source[7] { 0.0f, e1, -e1, e2, -e2, l1, l2 };
                 for (int u = 0; u < 2; ++u)
                 {
                     const auto& d = k.delay[u];
-                    if (d.timeSource != 0 && d.timeDepth != 0.0f)
-                        line[c][u].modulateTime (d.timeDepth, source[d.timeSource]);
-                    if (d.feedbackSource != 0 && d.feedbackDepth != 0.0f)
-                        line[c][u].modulateFeedback (d.feedbackDepth, source[d.feedbackSource]);
-                    else
-                        line[c][u].feedback = line[c][u].baseFeedback;
+                    line[c][u].modulate (d.timeSource != 0 ? d.timeDepth : 0.0f, source[d.timeSource],
+                                         d.feedbackSource != 0 ? d.feedbackDepth : 0.0f, source[d.feedbackSource]);
                 }
 
                 float o1, o2;
@@ -305,20 +276,20 @@ struct Model
                     o2 = heard (1, line[c][1].process (x)), o1 = heard (0, line[c][0].process (o2));
                 else
                     o1 = heard (0, line[c][0].process (x)), o2 = heard (1, line[c][1].process (k.mixMode == 1 ? o1 : x));
-
+                const int heardDelays = wetOf[k.mixMode][c];
                 const float w1 = k.delay[0].gain * o1, w2 = k.delay[1].gain * o2;
-                const int wet = wetOf[k.mixMode][c];
-                const float v = (wet == 0 ? w1 + w2 : wet == 1 ? w1 : w2) * k.dryWet + (1.0f - k.dryWet) * x;
+                const float wet = heardDelays == 3 ? w1 + w2 : heardDelays == 1 ? w1 : w2;
+                const float v = wet * k.dryWet + (1.0f - k.dryWet) * x;
                 io[c][j] = shape (v, k.shaper, k.amount);
             }
     }
 
     double sampleRate = 44100.0;
     float offset = 1.0e-25f; // denormal offset, negated every block
-    float smoothed[2] = { 120.0f, 220.0f }, step[2] = { 0.0f, 0.0f }; // glide of each delay time, ms
+    float smoothed[2] { 120.0f, 220.0f }, step[2] {}; // glide of each delay time, ms
     Line line[2][2];         // [channel][delay]
     Follower follower[2][2]; // [channel][follower]
     std::vector<Lfo> lfos;
-    unsigned silenced = 0;   // for tests: bits 0, 1 mute a delay's output, bits 2..5 envelope 1, 2, LFO 1, 2
+    unsigned silenced = 0;   // for tests: bits 0, 1 mute Delay 1, 2; bits 2..5 envelope 1, 2, LFO 1, 2
 };
 } // namespace reference

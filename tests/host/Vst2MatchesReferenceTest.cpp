@@ -1,8 +1,8 @@
-// The shipped VST2 binary against the plain reference model, through nothing but dlopen and the
-// VST 2.4 calls a host makes: the 33 parameters set as normalised values, notes as MIDI events,
-// the tempo answered through the time info, audio through processReplacing. The binary seeds its
-// "Sample & Hold" tables randomly per instance, so scenarios that hear them are compared through
-// the engine only (tests/dsp); every other scenario must match here exactly as well.
+// The shipped VST2 binary against the plain reference model, through dlopen and the VST 2.4 calls
+// a host makes: the 33 parameters as normalised values, notes as MIDI events, the tempo through
+// the time info, audio through processReplacing. The binary seeds its "Sample & Hold" tables
+// randomly per instance, so scenarios that hear them are compared through the engine only
+// (tests/dsp); every other one must match here exactly as well.
 
 #include "../dsp/ReferenceScenarios.h"
 
@@ -27,29 +27,25 @@ VstIntPtr hostCallback (AEffect*, VstInt32 opcode, VstInt32, VstIntPtr, void*, f
 Audio vst2Run (const Scenario& s)
 {
     void* library = dlopen (VELTRANE_VST2_BINARY, RTLD_NOW | RTLD_LOCAL);
-    EXPECT_NE (library, nullptr) << dlerror();
     auto main = reinterpret_cast<AEffect* (*) (AEffectDispatcherProc)> (dlsym (library, "VSTPluginMain"));
     AEffect* effect = main (reinterpret_cast<AEffectDispatcherProc> (hostCallback));
     auto dispatch = [effect] (VstInt32 opcode, VstIntPtr value, void* ptr = nullptr, float opt = 0.0f) { return effect->dispatcher (effect, opcode, 0, value, ptr, opt); };
 
-    dispatch (effOpen, 0);
     VstSpeakerArrangement in {}, out {};
     in.type = out.type = s.channels == 1 ? kSpeakerArrMono : kSpeakerArrStereo;
     in.numChannels = out.numChannels = s.channels;
+    dispatch (effOpen, 0);
     dispatch (effSetSpeakerArrangement, reinterpret_cast<VstIntPtr> (&in), &out);
     dispatch (effSetSampleRate, 0, nullptr, (float) s.sampleRate);
     dispatch (effSetBlockSize, s.blockSize);
     dispatch (effMainsChanged, 1);
     timeInfo = {};
-    timeInfo.sampleRate = s.sampleRate;
-    timeInfo.tempo = s.tempo.bpm;
-    timeInfo.flags = s.tempo.hasTempo ? kVstTempoValid : 0;
+    timeInfo.sampleRate = s.sampleRate, timeInfo.tempo = s.tempo.bpm, timeInfo.flags = s.tempo.hasTempo ? kVstTempoValid : 0;
     answersTime = s.tempo.hasPosition;
 
     auto audio = run (s, [&] (const float* values, float* const* io, int n, const std::vector<Midi>& events) {
         for (int i = 0; i < 33; ++i)
             effect->setParameter (effect, i, values[i]);
-
         VstMidiEvent midi[16] {};
         struct { VstInt32 numEvents; VstIntPtr reserved; VstEvent* events[16]; } list {};
         for (const auto& e : events)
@@ -69,20 +65,17 @@ Audio vst2Run (const Scenario& s)
     return audio;
 }
 
-bool hearsSampleAndHold (const Scenario& s)
-{
-    const auto k = initialKnobs (s);
-    auto holds = [&k] (int source, float depth) { return depth != 0.0f && source >= 5 && k.lfo[source - 5].wave == 5; };
-    return holds (k.delay[0].timeSource, k.delay[0].timeDepth) || holds (k.delay[0].feedbackSource, k.delay[0].feedbackDepth)
-        || holds (k.delay[1].timeSource, k.delay[1].timeDepth) || holds (k.delay[1].feedbackSource, k.delay[1].feedbackDepth);
-}
-
 std::vector<Scenario> withoutSampleAndHold()
 {
     std::vector<Scenario> kept;
     for (const auto& s : scenarios())
-        if (! hearsSampleAndHold (s))
+    {
+        const auto k = knobsFrom (s.values().data());
+        auto holds = [&k] (int source, float depth) { return depth != 0.0f && source >= 5 && k.lfo[source - 5].wave == 5; };
+        if (! holds (k.delay[0].timeSource, k.delay[0].timeDepth) && ! holds (k.delay[0].feedbackSource, k.delay[0].feedbackDepth)
+            && ! holds (k.delay[1].timeSource, k.delay[1].timeDepth) && ! holds (k.delay[1].feedbackSource, k.delay[1].feedbackDepth))
             kept.push_back (s);
+    }
     return kept;
 }
 
@@ -91,8 +84,7 @@ class Vst2MatchesReference : public ::testing::TestWithParam<Scenario> {};
 
 TEST_P (Vst2MatchesReference, SampleBySample)
 {
-    const auto& s = GetParam();
-    EXPECT_TRUE (matches (referenceRun (s, 1), vst2Run (s), toleranceFor (s)));
+    EXPECT_TRUE (matches (referenceRun (GetParam(), 1), vst2Run (GetParam()), toleranceFor (GetParam())));
 }
 
 INSTANTIATE_TEST_SUITE_P (EveryScenario, Vst2MatchesReference, ::testing::ValuesIn (withoutSampleAndHold()), nameOf);
