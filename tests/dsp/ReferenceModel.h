@@ -41,7 +41,7 @@ inline Knobs knobsFrom (const float* v)
 {
     auto p = [v] (int i) { return physical (i, v[i]); };
     auto choice = [&p] (int i) { return (int) p (i); };
-    Knobs k;
+    Knobs k { {}, {}, {}, choice (14), v[15], choice (16), v[17] };
     for (int u = 0; u < 2; ++u)
     {
         const int d = 7 * u, e = 19 + 3 * u, l = 25 + 4 * u;
@@ -49,16 +49,14 @@ inline Knobs knobsFrom (const float* v)
         k.follower[u] = { amplitude (p (e)), p (e + 1), p (e + 2) };
         k.lfo[u] = { choice (l), p (l + 1), choice (l + 2) != 0, choice (l + 3) };
     }
-    k.mixMode = choice (14), k.dryWet = v[15], k.shaper = choice (16), k.amount = v[17];
     return k;
 }
 
 // The play head's tempo: 120 bpm without a position, 0 for a position without a tempo.
 inline float tempoOf (bool hasPosition, bool hasTempo, double bpm) { return ! hasPosition ? 120.0f : hasTempo ? (float) bpm : 0.0f; }
 
-struct Midi { int position, status, data1, data2; };
-
 // A note-on with velocity on MIDI channel 1 restarts LFO 1 (0), on channel 2 LFO 2 (1); else -1.
+struct Midi { int position, status, data1, data2; };
 inline int restartedLfo (const Midi& e) { return (e.status == 0x90 || e.status == 0x91) && e.data2 > 0 ? e.status - 0x90 : -1; }
 
 // juce::Random's 48-bit linear congruential generator.
@@ -128,11 +126,10 @@ struct Follower
     double sampleRate = 44100.0;
     float attack = 0.0f, release = 0.0f, envelope = 0.0f; // coefficients and state
 
-    void set (float attackMs, float releaseMs)
+    void set (const FollowerKnobs& k) // a time of 0 gives a coefficient of 0: instant following
     {
-        const double rate = (float) sampleRate;
-        attack = std::exp (-1.0f / (float) (attackMs * 0.001 * rate));
-        release = std::exp (-1.0f / (float) (releaseMs * 0.001 * rate));
+        attack = std::exp (-1.0f / (float) (k.attackMs * 0.001 * (double) (float) sampleRate));
+        release = std::exp (-1.0f / (float) (k.releaseMs * 0.001 * (double) (float) sampleRate));
     }
 
     float process (float input)
@@ -147,7 +144,7 @@ struct Line
     double sampleRate = 44100.0;
     int length = 88200, writeIndex = 0;
     std::vector<float> buffer = std::vector<float> (88200);
-    float delay = 0.0f, feedback = 0.0f, baseDelay = 0.0f, baseFeedback = 0.0f; // delays in samples
+    float delay = 0.0f, feedback = 0.0f, baseFeedback = 0.0f; // delay in samples
 
     void resize (double rate)
     {
@@ -155,18 +152,14 @@ struct Line
             length = (int) (rate / sampleRate * length), buffer.assign ((size_t) length, 0.0f), writeIndex = 0, sampleRate = rate;
     }
 
-    void setBase (float timeMs)
+    // The base delay from the smoothed time, clamped to [1, L] (NaN gives L), then both
+    // modulations; a depth of 0 (or the source "None") leaves the base.
+    void modulate (float timeMs, float timeDepth, float timeSource, float feedbackDepth, float feedbackSource)
     {
-        const float d = (float) ((float) sampleRate * (double) timeMs * 0.001), L = (float) length;
-        delay = baseDelay = d > L || std::isnan (d) ? L : d <= 0.0f ? 1.0f : d;
-    }
-
-    void modulate (float timeDepth, float timeSource, float feedbackDepth, float feedbackSource)
-    {
-        const float b = baseDelay, f = baseFeedback;
-        const float h = b > length * 0.5 ? length - b : b, hf = f > 0.5f ? 1.0f - f : f;
+        const float d = (float) ((float) sampleRate * (double) timeMs * 0.001), L = (float) length, f = baseFeedback;
+        const float b = d > L || std::isnan (d) ? L : d <= 0.0f ? 1.0f : d, h = b > length * 0.5 ? length - b : b;
         delay = timeDepth != 0.0f ? h * timeDepth * timeSource + b : b;
-        feedback = feedbackDepth != 0.0f ? hf * feedbackDepth * feedbackSource + f : f;
+        feedback = feedbackDepth != 0.0f ? (f > 0.5f ? 1.0f - f : f) * feedbackDepth * feedbackSource + f : f;
     }
 
     float process (float input)
@@ -196,8 +189,7 @@ inline float shape (float v, int shaper, float a)
 
 struct Model
 {
-    // The four LFO seeds are drawn from one: channel 0's LFO 1 and 2, then channel 1's.
-    explicit Model (uint64_t seed)
+    explicit Model (uint64_t seed) // the four LFO seeds, drawn from one: channel 0's LFO 1 and 2, then channel 1's
     {
         Random48 random { (int64_t) seed };
         for (int i = 0; i < 4; ++i)
@@ -206,8 +198,7 @@ struct Model
 
     Lfo& lfo (int channel, int index) { return lfos[(size_t) (2 * channel + index)]; }
 
-    // Rates that are not finite or outside 1 kHz..768 kHz are ignored.
-    void prepare (double rate)
+    void prepare (double rate) // rates that are not finite or outside 1 kHz..768 kHz are ignored
     {
         const bool change = rate >= 1000.0 && rate <= 768000.0 && rate != sampleRate;
         sampleRate = change ? rate : sampleRate;
@@ -239,17 +230,12 @@ struct Model
             if (smoothed[u] + step[u] == smoothed[u] && distance != 0.0f)
                 smoothed[u] = k.delay[u].timeMs, step[u] = 0.0f;
             for (int c = 0; c < 2; ++c)
-            {
-                line[c][u].baseFeedback = k.delay[u].feedback;
-                follower[c][u].set (k.follower[u].attackMs, k.follower[u].releaseMs);
-                lfo (c, u).set (k.lfo[u], tempo);
-            }
+                line[c][u].baseFeedback = k.delay[u].feedback, follower[c][u].set (k.follower[u]), lfo (c, u).set (k.lfo[u], tempo);
         }
 
         // The delays heard per mix mode and channel: bit 0 Delay 1, bit 1 Delay 2.
         static const int wetOf[7][2] { { 3, 3 }, { 2, 2 }, { 1, 1 }, { 1, 1 }, { 2, 2 }, { 1, 2 }, { 2, 1 } };
         auto heard = [this] (int unit, float v) { return (silenced >> unit & 1) != 0 ? 0.0f : v; };
-
         for (int c = 0; c < numChannels; ++c)
             for (int j = 0; j < n; ++j)
             {
@@ -257,39 +243,32 @@ struct Model
                 for (const auto& e : events)
                     if (c == 0 && e.position == j && restartedLfo (e) >= 0)
                         lfo (0, restartedLfo (e)).restart(), lfo (1, restartedLfo (e)).restart();
-                for (int u = 0; u < 2; ++u)
-                    smoothed[u] += step[u], line[c][u].setBase (smoothed[u]);
-
+                smoothed[0] += step[0], smoothed[1] += step[1];
                 const float e1 = heard (2, follower[c][0].process (k.follower[0].sensitivity * x));
                 const float e2 = heard (3, follower[c][1].process (k.follower[1].sensitivity * x));
                 const float l1 = heard (4, lfo (c, 0).tick()), l2 = heard (5, lfo (c, 1).tick());
                 const float source[7] { 0.0f, e1, -e1, e2, -e2, l1, l2 };
                 for (int u = 0; u < 2; ++u)
-                {
-                    const auto& d = k.delay[u];
-                    line[c][u].modulate (d.timeSource != 0 ? d.timeDepth : 0.0f, source[d.timeSource],
-                                         d.feedbackSource != 0 ? d.feedbackDepth : 0.0f, source[d.feedbackSource]);
-                }
+                    line[c][u].modulate (smoothed[u], k.delay[u].timeSource != 0 ? k.delay[u].timeDepth : 0.0f, source[k.delay[u].timeSource],
+                                         k.delay[u].feedbackSource != 0 ? k.delay[u].feedbackDepth : 0.0f, source[k.delay[u].feedbackSource]);
 
                 float o1, o2;
                 if (k.mixMode == 2)
                     o2 = heard (1, line[c][1].process (x)), o1 = heard (0, line[c][0].process (o2));
                 else
                     o1 = heard (0, line[c][0].process (x)), o2 = heard (1, line[c][1].process (k.mixMode == 1 ? o1 : x));
-                const int heardDelays = wetOf[k.mixMode][c];
-                const float w1 = k.delay[0].gain * o1, w2 = k.delay[1].gain * o2;
+                const float w1 = k.delay[0].gain * o1, w2 = k.delay[1].gain * o2, heardDelays = wetOf[k.mixMode][c];
                 const float wet = heardDelays == 3 ? w1 + w2 : heardDelays == 1 ? w1 : w2;
-                const float v = wet * k.dryWet + (1.0f - k.dryWet) * x;
-                io[c][j] = shape (v, k.shaper, k.amount);
+                io[c][j] = shape (wet * k.dryWet + (1.0f - k.dryWet) * x, k.shaper, k.amount);
             }
     }
 
     double sampleRate = 44100.0;
-    float offset = 1.0e-25f; // denormal offset, negated every block
+    float offset = 1.0e-25f;                          // denormal offset, negated every block
     float smoothed[2] { 120.0f, 220.0f }, step[2] {}; // glide of each delay time, ms
-    Line line[2][2];         // [channel][delay]
-    Follower follower[2][2]; // [channel][follower]
+    Line line[2][2];                                  // [channel][delay]
+    Follower follower[2][2];                          // [channel][follower]
     std::vector<Lfo> lfos;
-    unsigned silenced = 0;   // for tests: bits 0, 1 mute Delay 1, 2; bits 2..5 envelope 1, 2, LFO 1, 2
+    unsigned silenced = 0; // for tests: bits 0, 1 mute Delay 1, 2; bits 2..5 envelope 1, 2, LFO 1, 2
 };
 } // namespace reference
