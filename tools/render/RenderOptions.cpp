@@ -15,7 +15,7 @@ juce::String usage()
 
 juce::File defaultPluginPath()
 {
-    const auto installed = juce::File::getSpecialLocation (juce::File::currentExecutableFile)
+    const auto installed = juce::File::getSpecialLocation (juce::File::hostApplicationPath)
                                .getParentDirectory().getSiblingFile ("lib/vst/Veltrane.so");
     return installed.existsAsFile() ? installed : juce::File (VELTRANE_DEFAULT_VST2_BINARY);
 }

@@ -173,6 +173,7 @@ void printInfo (juce::AudioPluginInstance& plugin)
               << "vendor: " << description.manufacturerName << "\n"
               << "version: " << description.version << "\n"
               << "unique id: " << juce::String::toHexString (description.uniqueId) << "\n"
+              << "file: " << description.fileOrIdentifier << "\n"
               << "inputs: " << plugin.getTotalNumInputChannels() << ", outputs: " << plugin.getTotalNumOutputChannels() << "\n"
               << "parameters: " << plugin.getParameters().size() << "\n";
 
