@@ -6,54 +6,23 @@
 using namespace veltrane;
 using namespace veltrane::test;
 
-namespace
-{
-// Every text a label of the editor can show: each parameter's identifier, the texts
-// of every choice and of both ends of every continuous range, the preset names and
-// the labels' own captions.
-juce::StringArray everyText (VeltraneAudioProcessor& processor, const juce::Array<juce::Label*>& labels)
-{
-    juce::StringArray texts (processor.getPresetNames());
-
-    for (int i = 0; i < Param::count; ++i)
-    {
-        const auto* choices = parameterTable[(size_t) i].choices;
-        const auto last = choices != nullptr ? choices->size - 1 : 1;
-        texts.add (processor.getParameterName (i));
-
-        for (int k = 0; k <= last; ++k)
-        {
-            processor.setParameter (i, (float) k / (float) last);
-            texts.add (processor.getParameterText (i));
-        }
-    }
-
-    for (auto* label : labels)
-        texts.add (label->getText());
-
-    texts.removeDuplicates (false);
-    return texts;
-}
-
-// The characters JUCE lays out for text in area with font on one line: an ellipsis
-// replaces whatever does not fit.
-juce::String laidOut (const juce::Font& font, const juce::String& text, juce::Rectangle<int> area)
+// What JUCE lays out for text on one line of area: an ellipsis replaces what does not fit.
+static juce::String laidOut (const juce::Font& font, const juce::String& text, juce::Rectangle<float> area)
 {
     juce::GlyphArrangement glyphs;
-    glyphs.addFittedText (font, text, (float) area.getX(), (float) area.getY(), (float) area.getWidth(),
-                          (float) area.getHeight(), juce::Justification::centred, 1, 0.0f);
+    glyphs.addFittedText (font, text, area.getX(), area.getY(), area.getWidth(), area.getHeight(),
+                          juce::Justification::centred, 1, 0.0f);
     juce::String shown;
-
     for (int i = 0; i < glyphs.getNumGlyphs(); ++i)
         shown += juce::String::charToString (glyphs.getGlyph (i).getCharacter());
-
     return shown;
 }
-}
 
+// Every text a label can show (identifiers, every choice, both ends of every range,
+// the factory preset names, the captions), tried in every label of the editor.
 TEST (CaptionFit, EveryTextShowsWholeAndOnlyTextsThatDoNotFitShrink)
 {
-    const TemporaryHome home;   // a first run: the factory presets are the preset names
+    const TemporaryHome home;   // a first run, so the preset names are the factory set
 
     for (const auto size : { juce::Point<float> (1000.0f, 500.0f), juce::Point<float> (800.0f, 400.0f) })
     {
@@ -66,30 +35,43 @@ TEST (CaptionFit, EveryTextShowsWholeAndOnlyTextsThatDoNotFitShrink)
                 collect (*child);
         };
         collect (*open.editor);
-        ASSERT_GE (labels.size(), 40);   // 39 captions and the preset box's
+
+        juce::StringArray texts (open.processor.getPresetNames());
+        for (auto* label : labels)
+            texts.add (label->getText());
+        for (int i = 0; i < Param::count; ++i)
+        {
+            const auto* choices = parameterTable[(size_t) i].choices;
+            const auto last = choices != nullptr ? choices->size - 1 : 1;
+            texts.add (open.processor.getParameterName (i));
+            for (int k = 0; k <= last; ++k)
+            {
+                open.processor.setParameter (i, (float) k / (float) last);
+                texts.add (open.processor.getParameterText (i));
+            }
+        }
+        ASSERT_GE (labels.size(), 40);   // the captions and the preset box's text
+        ASSERT_GE (texts.size(), 200);
 
         auto& look = static_cast<juce::LookAndFeel_V2&> (open.editor->getLookAndFeel());
-        const auto texts = everyText (open.processor, labels);
-
         for (auto* label : labels)
         {
             const auto design = label->getFont();
-            const auto area = look.getLabelBorderSize (*label).subtractedFrom (label->getLocalBounds());
+            const auto area = look.getLabelBorderSize (*label).subtractedFrom (label->getLocalBounds()).toFloat();
 
             for (const auto& text : texts)
             {
                 label->setText (text, juce::dontSendNotification);
                 const auto font = look.getLabelFont (*label);
                 const auto width = font.getStringWidthFloat (text.trim());
-                const auto where = label->getName() + " at " + juce::String (size.x) + ": \"" + text + "\"";
+                const auto where = label->getName() + " at " + juce::String (size.x) + ": " + text;
 
                 EXPECT_EQ (laidOut (font, text, area), text.trim()) << where;
-                EXPECT_LE (width, (float) area.getWidth() + 0.01f) << where;   // not squashed either
-
-                if (design.getStringWidthFloat (text.trim()) <= (float) area.getWidth())
+                EXPECT_LE (width, area.getWidth() + 0.01f) << where;   // whole, and not squashed either
+                if (design.getStringWidthFloat (text.trim()) <= area.getWidth())
                     EXPECT_EQ (font.getHeight(), design.getHeight()) << where;
                 else
-                    EXPECT_GE (width, 0.99f * (float) area.getWidth()) << where;   // no smaller than needed
+                    EXPECT_GE (width, 0.99f * area.getWidth()) << where;   // no smaller than it must be
             }
         }
     }

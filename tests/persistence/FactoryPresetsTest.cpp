@@ -8,77 +8,64 @@ using namespace veltrane::test;
 
 namespace
 {
-// The preset files of the source tree, the set a first run must write.
-juce::Array<juce::File> sourcePresets()
-{
-    auto files = juce::File (VELTRANE_FACTORY_PRESETS).findChildFiles (juce::File::findFiles, false, "*.vtp");
-    files.sort();
-    return files;
-}
+// The preset files of the source tree: the set a first run must write.
+const auto sources = juce::File (VELTRANE_FACTORY_PRESETS).findChildFiles (juce::File::findFiles, false, "*.vtp");
 
-juce::StringArray namesIn (const juce::File& folder)
+juce::StringArray fileNamesIn (const juce::Array<juce::File>& files)
 {
     juce::StringArray names;
-    for (const auto& file : folder.findChildFiles (juce::File::findFiles, false, "*"))
+    for (const auto& file : files)
         names.add (file.getFileName());
     names.sort (false);
     return names;
 }
+
+juce::StringArray presetFiles() { return fileNamesIn (presetFolder().findChildFiles (juce::File::findFiles, false, "*")); }
 }
 
-TEST (FactoryPresets, FirstRunWritesExactlyTheFactorySetAndEachSetsAll33Values)
+TEST (FactoryPresets, AFirstRunWritesEachOnceAndEachSetsAll33Values)
 {
     const TemporaryHome home;
-    VeltraneAudioProcessor processor;
-    const auto sources = sourcePresets();
-    ASSERT_GE (sources.size(), 16);
-
-    juce::StringArray expected;
-    for (const auto& source : sources)
-        expected.add (source.getFileName());
-    EXPECT_EQ (namesIn (presetFolder()), expected);
-
-    // Each one loaded as the preset box or a program change loads it: by its index in the list.
-    const auto listed = processor.getPresetNames();
-    ASSERT_EQ (listed.size(), sources.size());
-
-    for (const auto& source : sources)
     {
-        const auto name = source.getFileNameWithoutExtension();
-        const auto xml = juce::XmlDocument::parse (source);
-        ASSERT_NE (xml, nullptr) << name;
-        EXPECT_EQ (xml->getStringAttribute ("PresetName"), name);
+        VeltraneAudioProcessor processor;
+        ASSERT_GE (sources.size(), 16);
+        EXPECT_EQ (presetFiles(), fileNamesIn (sources));
+        const auto listed = processor.getPresetNames();
 
-        for (int i = 0; i < Param::count; ++i)   // away from every stored value first
-            processor.setParameter (i, std::abs (xml->getDoubleAttribute (processor.getParameterName (i)) - 0.37) < 1e-6 ? 0.73f : 0.37f);
-
-        processor.presetToLoad.store (listed.indexOf (name));
-        processor.presetLoadPending.store (true);
-        processBlock (processor);
-
-        EXPECT_EQ (processor.getPresetName(), name);
-        for (int i = 0; i < Param::count; ++i)
+        for (const auto& source : sources)
         {
-            const auto id = processor.getParameterName (i);
-            ASSERT_TRUE (xml->hasAttribute (id)) << name << " " << id;
-            EXPECT_EQ (processor.getParameter (i), (float) xml->getDoubleAttribute (id)) << name << " " << id;
+            const auto name = source.getFileNameWithoutExtension();
+            const auto xml = juce::XmlDocument::parse (source);
+            ASSERT_NE (xml, nullptr) << name;
+            EXPECT_EQ (xml->getStringAttribute ("PresetName"), name);
+
+            for (int i = 0; i < Param::count; ++i)   // away from every stored value first
+                processor.setParameter (i, xml->getStringAttribute (processor.getParameterName (i)) == "0.37" ? 0.73f : 0.37f);
+
+            // Loaded as the preset box or a program change loads it: by its place in the list.
+            processor.presetToLoad.store (listed.indexOf (name));
+            processor.presetLoadPending.store (true);
+            processBlock (processor);
+
+            EXPECT_EQ (processor.getPresetName(), name);
+            for (int i = 0; i < Param::count; ++i)
+            {
+                const auto id = processor.getParameterName (i);
+                ASSERT_TRUE (xml->hasAttribute (id)) << name << " " << id;
+                EXPECT_EQ (processor.getParameter (i), (float) xml->getDoubleAttribute (id)) << name << " " << id;
+            }
         }
     }
-}
 
-TEST (FactoryPresets, LaterRunsNeitherBringBackNorOverwriteAPreset)
-{
-    const TemporaryHome home;
-    { VeltraneAudioProcessor firstRun; }
-    const auto deleted = presetFolder().getChildFile (sourcePresets()[0].getFileName());
-    const auto changed = presetFolder().getChildFile (sourcePresets()[1].getFileName());
-    ASSERT_TRUE (deleted.deleteFile());
-    ASSERT_TRUE (changed.replaceWithText ("<VELTRANE_PRESET PresetName=\"Mine\" DryWet=\"0.25\"/>"));
-    const auto before = namesIn (presetFolder());
+    // A later run brings back no preset the user deleted and overwrites none they changed.
+    const juce::String mine ("<VELTRANE_PRESET PresetName=\"Mine\" DryWet=\"0.25\"/>");
+    ASSERT_TRUE (presetFolder().getChildFile (sources[0].getFileName()).deleteFile());
+    ASSERT_TRUE (presetFolder().getChildFile (sources[1].getFileName()).replaceWithText (mine));
+    const auto before = presetFiles();
 
     VeltraneAudioProcessor secondRun;
 
-    EXPECT_EQ (namesIn (presetFolder()), before);
-    EXPECT_EQ (changed.loadFileAsString(), "<VELTRANE_PRESET PresetName=\"Mine\" DryWet=\"0.25\"/>");
-    EXPECT_EQ (secondRun.getPresetNames().size(), sourcePresets().size() - 1);
+    EXPECT_EQ (presetFiles(), before);
+    EXPECT_EQ (presetFolder().getChildFile (sources[1].getFileName()).loadFileAsString(), mine);
+    EXPECT_EQ (secondRun.getPresetNames().size(), sources.size() - 1);
 }
