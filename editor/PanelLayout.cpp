@@ -5,6 +5,11 @@
 namespace veltrane
 {
 
+namespace
+{
+constexpr double continuousStep = 0.001;
+}
+
 void placeRelative (juce::Component& child, const RelativeBounds& bounds, int parentWidth, int parentHeight)
 {
     const auto w = (float) parentWidth;
@@ -26,9 +31,22 @@ void setUpSlider (juce::Component& panel, juce::Slider& slider, const juce::Stri
     slider.setName (name);
     panel.addAndMakeVisible (slider);
     if (choiceSteps > 0)
+    {
         slider.setRange (0.0, (double) choiceSteps, 1.0);
+    }
     else
-        slider.setRange (0.0, 1.0, 0.001);
+    {
+        // Every value snaps to the step except the double-click value, which is kept
+        // whole: a double click gives the host the parameter's exact default, such as
+        // 0.243987 for 120 ms, which the step would round to 0.244.
+        juce::NormalisableRange<double> range (0.0, 1.0, {}, {}, [&slider] (double start, double end, double value) {
+            if (slider.isDoubleClickReturnEnabled() && value == slider.getDoubleClickReturnValue())
+                return value;
+            return juce::jlimit (start, end, start + continuousStep * std::floor ((value - start) / continuousStep + 0.5));
+        });
+        range.interval = continuousStep;
+        slider.setNormalisableRange (range);
+    }
     slider.setSliderStyle (style);
     slider.setTextBoxStyle (juce::Slider::NoTextBox, false, 0, 0);
     slider.setColour (juce::Slider::thumbColourId, juce::Colour (Palette::accent));

@@ -21,8 +21,8 @@ void placeRelative (juce::Component& child, const RelativeBounds& bounds, int pa
 juce::Font makeCaptionFont (float height);
 
 // Knob (or the given style) without a text box, in the accent colour, listened to by
-// the panel. A continuous slider runs 0 to 1 in steps of 0.001, a choice slider 0 to
-// choiceSteps in steps of 1.
+// the panel. A continuous slider runs 0 to 1 in steps of 0.001 (its double-click value
+// exactly), a choice slider 0 to choiceSteps in steps of 1.
 void setUpSlider (juce::Component& panel, juce::Slider& slider, const juce::String& name,
                   juce::Slider::Listener& listener, int choiceSteps = 0,
                   juce::Slider::SliderStyle style = juce::Slider::RotaryVerticalDrag);

@@ -171,6 +171,19 @@ void VeltraneLook::drawComboBox (juce::Graphics& g, int width, int height, bool,
     g.fillPath (arrows);
 }
 
+juce::Font VeltraneLook::getLabelFont (juce::Label& label)
+{
+    const auto font = label.getFont();
+    const auto available = (float) getLabelBorderSize (label).subtractedFrom (label.getLocalBounds()).getWidth();
+    const auto needed = font.getStringWidthFloat (label.getText().trim());   // JUCE draws the trimmed text
+
+    // Text widths grow in proportion to the font height.
+    if (needed <= available || available <= 0.0f)
+        return font;
+
+    return font.withHeight (font.getHeight() * available / needed);
+}
+
 void VeltraneLook::drawLinearSliderBackground (juce::Graphics&, int, int, int, int, float, float, float,
                                                juce::Slider::SliderStyle, juce::Slider&)
 {

@@ -36,6 +36,11 @@ public:
     void drawComboBox (juce::Graphics&, int width, int height, bool isButtonDown,
                        int buttonX, int buttonY, int buttonW, int buttonH, juce::ComboBox&) override;
 
+    // The label's own font, or, for a text wider than the label's text area, the
+    // same font just small enough to show it whole (JUCE would squash it and then
+    // cut it short with an ellipsis).
+    juce::Font getLabelFont (juce::Label&) override;
+
     // A linear slider has no visible track.
     void drawLinearSliderBackground (juce::Graphics&, int x, int y, int width, int height,
                                      float sliderPos, float minSliderPos, float maxSliderPos,

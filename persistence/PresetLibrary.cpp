@@ -1,5 +1,6 @@
 #include "PresetLibrary.h"
 
+#include "FactoryPresets.h"
 #include "SafeXml.h"
 
 #include <filesystem>
@@ -145,8 +146,9 @@ void PresetLibrary::initialise (const juce::String& productName, const juce::Str
 
     const juce::File folder (presetFolder);
 
-    if (! folder.isDirectory())
-        folder.createDirectory();
+    // A folder made here is a first run: it receives the factory presets.
+    if (! folder.isDirectory() && folder.createDirectory().wasOk())
+        writeFactoryPresets (folder);
 
     rescan();
 }

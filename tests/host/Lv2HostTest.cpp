@@ -47,7 +47,9 @@ class Lv2Host : public ::testing::Test
 protected:
     void SetUp() override
     {
-        ::setenv ("LV2_PATH", VELTRANE_LV2_PATH, 1);
+        // VELTRANE_TEST_LV2_PATH points the test at another tree, such as an unpacked package.
+        const auto* path = std::getenv ("VELTRANE_TEST_LV2_PATH");
+        ::setenv ("LV2_PATH", path != nullptr ? path : VELTRANE_LV2_PATH, 1);
         world = lilv_world_new();
         lilv_world_load_all (world);
 

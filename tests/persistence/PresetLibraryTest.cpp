@@ -33,6 +33,7 @@ juce::StringArray filesUnder (const juce::File& root)
 TEST (PresetLibrary, EmptyFolderGivesEmptyListAndInit)
 {
     TemporaryHome home;
+    presetFolder().createDirectory();
     VeltraneAudioProcessor processor;
 
     EXPECT_TRUE (presetFolder().isDirectory());
@@ -44,6 +45,7 @@ TEST (PresetLibrary, EmptyFolderGivesEmptyListAndInit)
 TEST (PresetLibrary, SavingInitWritesJuceLayoutWithoutControllers)
 {
     TemporaryHome home;
+    presetFolder().createDirectory();
     VeltraneAudioProcessor processor;
     processor.getParameterRecord (0).midiController.store (74);
     processor.presetListChanged.store (false);

@@ -1,9 +1,13 @@
 // Renders the editor offscreen to two PNG files: the factory defaults at the default
-// size 1000 x 500, and a changed state at the smallest size 800 x 400.
+// size 1000 x 500, and a changed state with the longest texts at the smallest size
+// 800 x 400. With --icon it draws the maker's logo as the application icon instead.
 //
 //     veltrane-editor-shot DEFAULT.png CHANGED.png
+//     veltrane-editor-shot --icon SIZE ICON.png
 
 #include "editor/VeltraneAudioProcessorEditor.h"
+#include "look/TarnwellLogo.h"
+#include "look/VeltraneLook.h"
 #include "plugin/VeltraneAudioProcessor.h"
 #include "tools/common/PrivateHome.h"
 
@@ -27,16 +31,17 @@ void pollPanels (juce::Component& root)
 
 void setNonDefaultState (VeltraneAudioProcessor& processor)
 {
+    // The last value set names the last parameter shown at the top of the middle column.
     const std::pair<int, float> values[] {
         { Param::Delay1Time, 0.55f },       { Param::Delay1Feedback, 0.72f },
-        { Param::Delay1TimeMod, 0.35f },    { Param::Delay1TimeModSource, 5.0f / 6.0f },
+        { Param::Delay1TimeMod, 0.35f },    { Param::Delay1TimeModSource, 2.0f / 6.0f },
         { Param::Delay2Time, 0.4f },        { Param::Delay2FeedbackMod, 0.6f },
-        { Param::Delay2FeedbackModSource, 2.0f / 6.0f }, { Param::Delay2Gain, 0.62f },
-        { Param::MixMode, 5.0f / 6.0f },    { Param::DryWet, 0.45f },
-        { Param::Waveshaper, 1.0f },        { Param::WaveshaperAmount, 0.3f },
-        { Param::Envelope1Attack, 0.8f },   { Param::Envelope2Sensitivity, 0.2f },
-        { Param::LFO1Sync, 1.0f },          { Param::LFO1SyncedRate, 10.0f / 17.0f },
-        { Param::LFO2Wave, 4.0f / 5.0f },   { Param::LFO2Rate, 0.5f },
+        { Param::Delay2Gain, 0.62f },       { Param::MixMode, 1.0f },
+        { Param::DryWet, 0.45f },           { Param::Waveshaper, 2.0f / 3.0f },
+        { Param::WaveshaperAmount, 0.3f },  { Param::Envelope1Attack, 0.8f },
+        { Param::Envelope2Sensitivity, 0.2f }, { Param::LFO1Sync, 1.0f },
+        { Param::LFO1SyncedRate, 17.0f / 17.0f }, { Param::LFO2Wave, 1.0f },
+        { Param::LFO2Rate, 0.5f },          { Param::Delay2FeedbackModSource, 4.0f / 6.0f },
     };
 
     for (const auto& [index, value] : values)
@@ -53,18 +58,49 @@ bool writeShot (VeltraneAudioProcessor& processor, const juce::File& file)
     juce::FileOutputStream stream (file);
     return stream.openedOk() && juce::PNGImageFormat().writeImageToStream (image, stream);
 }
+
+// The logo on the editor's ground, square, for the application's icon.
+bool writeIcon (int size, const juce::File& file)
+{
+    juce::Image image (juce::Image::ARGB, size, size, true);
+    {
+        juce::Graphics g (image);
+        g.setColour (juce::Colour (Palette::ground));
+        g.fillRoundedRectangle (image.getBounds().toFloat(), (float) size * 0.125f);
+        TarnwellLogo logo;
+        logo.setSize (size, size);
+        logo.paintEntireComponent (g, false);
+    }
+
+    file.deleteFile();
+    juce::FileOutputStream stream (file);
+    return stream.openedOk() && juce::PNGImageFormat().writeImageToStream (image, stream);
+}
 }
 
 int main (int argc, char** argv)
 {
-    if (argc != 3)
+    const auto iconMode = argc == 4 && juce::String (argv[1]) == "--icon";
+
+    if (argc != 3 && ! iconMode)
     {
-        std::cerr << "usage: veltrane-editor-shot DEFAULT.png CHANGED.png\n";
+        std::cerr << "usage: veltrane-editor-shot DEFAULT.png CHANGED.png\n"
+                     "       veltrane-editor-shot --icon SIZE ICON.png\n";
         return 2;
     }
 
     const veltrane::tools::PrivateHome privateHome;
     const juce::ScopedJuceInitialiser_GUI juce;
+
+    if (iconMode)
+    {
+        const auto size = juce::String (argv[2]).getIntValue();
+        if (size >= 16 && size <= 1024 && writeIcon (size, juce::File::getCurrentWorkingDirectory().getChildFile (argv[3])))
+            return 0;
+
+        std::cerr << "veltrane-editor-shot: cannot write the icon\n";
+        return 1;
+    }
     const auto defaultFile = juce::File::getCurrentWorkingDirectory().getChildFile (argv[1]);
     const auto changedFile = juce::File::getCurrentWorkingDirectory().getChildFile (argv[2]);
 

@@ -6,9 +6,18 @@ namespace veltrane::render
 juce::String usage()
 {
     return "usage: veltrane-render [--info] [--input in.wav] [--output out.wav] [--plot picture.png]\n"
-           "                       [--rate Hz] [--block samples] [--tail seconds]\n"
-           "                       [--preset file.vtp] [--state chunk.bin] [--plugin libVeltrane.so]\n"
-           "                       [Identifier=normalised ...]\n";
+           "                       [--rate Hz] [--block samples] [--tail seconds] [--bpm tempo]\n"
+           "                       [--preset file.vtp] [--state chunk.bin] [--plugin Veltrane.so|Veltrane.vst3]\n"
+           "                       [Identifier=normalised ...]\n"
+           "The plug-in plays along a transport running from the start in 4/4 at --bpm\n"
+           "beats per minute (120 by default), which tempo-synced LFOs follow.\n";
+}
+
+juce::File defaultPluginPath()
+{
+    const auto installed = juce::File::getSpecialLocation (juce::File::hostApplicationPath)
+                               .getParentDirectory().getSiblingFile ("lib/vst/Veltrane.so");
+    return installed.existsAsFile() ? installed : juce::File (VELTRANE_DEFAULT_VST2_BINARY);
 }
 
 namespace
@@ -28,7 +37,7 @@ namespace
 std::optional<RenderOptions> parseArguments (const juce::StringArray& args, juce::String& error)
 {
     RenderOptions options;
-    options.pluginPath = juce::File (VELTRANE_DEFAULT_VST2_BINARY);
+    options.pluginPath = defaultPluginPath();
     options.outputFile = juce::File::getCurrentWorkingDirectory().getChildFile ("veltrane-render.wav");
 
     for (int i = 0; i < args.size(); ++i)
@@ -78,6 +87,7 @@ std::optional<RenderOptions> parseArguments (const juce::StringArray& args, juce
         else if (arg == "--rate")                 { ok = numberValue (number, 8000.0, 384000.0); options.sampleRate = number; }
         else if (arg == "--block")                { ok = numberValue (number, 1.0, 65536.0); options.blockSize = (int) number; }
         else if (arg == "--tail")                 { ok = numberValue (number, 0.0, 600.0); options.tailSeconds = number; }
+        else if (arg == "--bpm")                  { ok = numberValue (number, 1.0, 999.0); options.tempoBpm = number; }
         else if (arg == "--help" || arg == "-h")  { error = usage().trimEnd(); return std::nullopt; }
         else if (arg.containsChar ('=') && ! arg.startsWith ("-"))
         {

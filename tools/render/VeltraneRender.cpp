@@ -68,17 +68,51 @@ juce::AudioBuffer<float> readInput (const juce::File& file, double& fileRate)
     return buffer;
 }
 
+// A transport that plays from the start at a steady tempo in 4/4; the render moves
+// it on after every block.
+class SteadyPlayHead final : public juce::AudioPlayHead
+{
+public:
+    SteadyPlayHead (double bpm, double rate) : tempoBpm (bpm), sampleRate (rate) {}
+
+    void advance (int samples) noexcept { position += samples; }
+
+    juce::Optional<PositionInfo> getPosition() const override
+    {
+        const auto beats = (double) position / sampleRate * tempoBpm / 60.0;
+        PositionInfo info;
+        info.setBpm (tempoBpm);
+        info.setTimeSignature (TimeSignature { 4, 4 });
+        info.setIsPlaying (true);
+        info.setTimeInSamples (position);
+        info.setTimeInSeconds ((double) position / sampleRate);
+        info.setPpqPosition (beats);
+        info.setPpqPositionOfLastBarStart (4.0 * std::floor (beats / 4.0));
+        info.setBarCount ((juce::int64) (beats / 4.0));
+        return info;
+    }
+
+private:
+    double tempoBpm, sampleRate;
+    juce::int64 position = 0;
+};
+
+// A VST3 bundle (a folder ending in .vst3) or a VST2 binary.
 std::unique_ptr<juce::AudioPluginInstance> loadPlugin (const juce::File& path, double sampleRate, int blockSize)
 {
-    if (! path.existsAsFile())
+    const auto isVst3 = path.hasFileExtension ("vst3");
+
+    if (! (isVst3 ? path.exists() : path.existsAsFile()))
         throw Failure { "plug-in not found: " + path.getFullPathName() };
 
-    juce::VSTPluginFormat format;
+    juce::VSTPluginFormat vst2;
+    juce::VST3PluginFormat vst3;
+    auto& format = isVst3 ? static_cast<juce::AudioPluginFormat&> (vst3) : vst2;
     juce::OwnedArray<juce::PluginDescription> descriptions;
     format.findAllTypesForFile (descriptions, path.getFullPathName());
 
     if (descriptions.isEmpty())
-        throw Failure { "not a loadable VST2 plug-in: " + path.getFullPathName() };
+        throw Failure { juce::String ("not a loadable ") + (isVst3 ? "VST3" : "VST2") + " plug-in: " + path.getFullPathName() };
 
     juce::String error;
     auto instance = format.createInstanceFromDescription (*descriptions[0], sampleRate, blockSize, error);
@@ -139,6 +173,7 @@ void printInfo (juce::AudioPluginInstance& plugin)
               << "vendor: " << description.manufacturerName << "\n"
               << "version: " << description.version << "\n"
               << "unique id: " << juce::String::toHexString (description.uniqueId) << "\n"
+              << "file: " << description.fileOrIdentifier << "\n"
               << "inputs: " << plugin.getTotalNumInputChannels() << ", outputs: " << plugin.getTotalNumOutputChannels() << "\n"
               << "parameters: " << plugin.getParameters().size() << "\n";
 
@@ -147,7 +182,7 @@ void printInfo (juce::AudioPluginInstance& plugin)
                   << " = " << parameter->getValue() << " (" << parameter->getCurrentValueAsText() << ")\n";
 }
 
-void render (juce::AudioPluginInstance& plugin, juce::AudioBuffer<float>& audio, int blockSize)
+void render (juce::AudioPluginInstance& plugin, juce::AudioBuffer<float>& audio, int blockSize, SteadyPlayHead& playHead)
 {
     const auto channels = audio.getNumChannels();
     juce::AudioBuffer<float> block (juce::jmax (channels, plugin.getTotalNumOutputChannels()), blockSize);
@@ -163,6 +198,7 @@ void render (juce::AudioPluginInstance& plugin, juce::AudioBuffer<float>& audio,
             block.copyFrom (c, 0, audio, c, start, length);
 
         plugin.processBlock (block, midi);
+        playHead.advance (length);
         midi.clear();
 
         for (int c = 0; c < channels; ++c)
@@ -315,7 +351,10 @@ int run (const RenderOptions& options)
         audio.copyFrom (c, 0, input, c, 0, input.getNumSamples());
 
     auto inputPadded = audio;
-    render (*plugin, audio, options.blockSize);
+    SteadyPlayHead playHead (options.tempoBpm, sampleRate);
+    plugin->setPlayHead (&playHead);
+    render (*plugin, audio, options.blockSize, playHead);
+    plugin->setPlayHead (nullptr);
     plugin->releaseResources();
 
     double sumOfSquares = 0.0;
