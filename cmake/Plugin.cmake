@@ -28,6 +28,7 @@ target_sources (Veltrane PRIVATE
     plugin/ProcessorPersistence.cpp
     persistence/Preferences.cpp
     persistence/PresetLibrary.cpp
+    persistence/SafeFile.cpp
     persistence/SafeXml.cpp
     persistence/StateChunk.cpp
     editor/PanelLayout.cpp
