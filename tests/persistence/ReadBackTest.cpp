@@ -8,33 +8,24 @@ using namespace veltrane::test;
 
 namespace
 {
-juce::MemoryBlock utf8 (const juce::String& text, const char* prefix = "")
+juce::MemoryBlock bytes (const char* prefix, const juce::String& text)
 {
-    juce::MemoryBlock bytes (prefix, std::strlen (prefix));
-    bytes.append (text.toRawUTF8(), text.getNumBytesAsUTF8());
-    return bytes;
+    juce::MemoryBlock block (prefix, std::strlen (prefix));
+    block.append (text.toRawUTF8(), text.getNumBytesAsUTF8());
+    return block;
 }
 
-// Byte-order mark and code units, each unit as its two bytes in the given order.
+// Byte-order mark and text as JUCE encodes UTF-16 (surrogate pairs included).
 juce::MemoryBlock utf16 (const juce::String& text, bool bigEndian)
 {
-    juce::MemoryOutputStream out;
-    const auto write = [&] (juce::uint16 unit) { out.writeShort ((short) (bigEndian ? juce::ByteOrder::swap (unit) : unit)); };
-    write (0xfeff);
+    const auto marked = juce::String::charToString (0xfeff) + text;
+    const auto units = marked.toUTF16();
+    juce::MemoryBlock block (units.getAddress(), units.sizeInBytes() - 2);
 
-    for (auto c : juce::Array<juce::juce_wchar> (text.toUTF32().getAddress(), text.length()))
-    {
-        if (c < 0x10000)
-        {
-            write ((juce::uint16) c);
-            continue;
-        }
+    for (size_t i = 0; bigEndian && i < block.getSize(); i += 2)
+        std::swap (block[i], block[i + 1]);
 
-        write ((juce::uint16) (0xd800 + ((c - 0x10000) >> 10)));
-        write ((juce::uint16) (0xdc00 + ((c - 0x10000) & 0x3ff)));
-    }
-
-    return out.getMemoryBlock();
+    return block;
 }
 }
 
@@ -50,19 +41,18 @@ TEST (ReadBack, PresetsInEveryEncodingJuceReadsLoadAndEntitiesStayRefused)
     for (int i = 1; i < 10; ++i)
         laughs << "<!ENTITY a" << i << " \"" << juce::String::repeatedString ("&a" + juce::String (i - 1) + ";", 10) << "\">";
 
-    // The name's "W" (unit 29, after the mark) made a high surrogate before the "i".
+    // The name's "W" (unit 29 after the mark) made a high surrogate before the "i".
     auto loneSurrogate = utf16 (body, false);
-    static_cast<juce::uint8*> (loneSurrogate.getData())[60] = 0x00;
-    static_cast<juce::uint8*> (loneSurrogate.getData())[61] = 0xd8;
+    loneSurrogate[60] = 0x00;
+    loneSurrogate[61] = (char) 0xd8;
 
     const struct { const char* what; juce::MemoryBlock bytes; bool loads; } cases[] = {
-        { "UTF-8 with byte-order mark", utf8 (body, "\xef\xbb\xbf"), true },
+        { "UTF-8 with byte-order mark", bytes ("\xef\xbb\xbf", body), true },
         { "UTF-16 little-endian", utf16 ("<?xml version=\"1.0\" encoding=\"UTF-16\"?>\n" + body, false), true },
         { "UTF-16 big-endian", utf16 (body, true), true },
-        { "internal DTD subset", utf8 ("<?xml version=\"1.0\"?>\n" + subset + body), true },
-        { "billion laughs", utf8 (laughs + "]><VELTRANE_PRESET PresetName=\"&a9;\" Delay1Feedback=\"0.25\"/>"), false },
-        { "declared entity in use", utf8 ("<!DOCTYPE VELTRANE_PRESET [<!ENTITY n \"x\">]><VELTRANE_PRESET PresetName=\"&n;\" Delay1Feedback=\"0.25\"/>"), false },
-        { "bracket in a DTD literal", utf8 ("<!DOCTYPE VELTRANE_PRESET [<!ENTITY n \"a>b\">]>" + body), false },
+        { "internal DTD subset", bytes ("<?xml version=\"1.0\"?>\n", subset + body), true },
+        { "billion laughs", bytes ("", laughs + "]><VELTRANE_PRESET PresetName=\"&a9;\" Delay1Feedback=\"0.25\"/>"), false },
+        { "declared entity in use", bytes ("<!DOCTYPE VELTRANE_PRESET [<!ENTITY n \"x\">]>", body.replace ("Wide", "&n;")), false },
         { "UTF-16 lone surrogate", loneSurrogate, false },
         { "UTF-16 odd length", [&] { auto b = utf16 (body, false); b.append ("<", 1); return b; }(), false },
     };
@@ -79,35 +69,22 @@ TEST (ReadBack, PresetsInEveryEncodingJuceReadsLoadAndEntitiesStayRefused)
     }
 }
 
-// A name longer than a state can hold is cut where it comes in, so the state that
-// carries it restores every setting in the next instance.
+// A name longer than a state can hold is cut where it comes in (a preset picked by
+// program change, typing), so the state carrying it restores every setting.
 TEST (ReadBack, LongestNamesRoundTripThroughTheState)
 {
     TemporaryHome home;
     presetFolder().createDirectory();
     const auto tooLong = juce::String::repeatedString (juce::String::fromUTF8 ("\xc3\xa9"), 200000);
-    const auto widest = juce::String::repeatedString (juce::String::charToString (0x10ffff), 110000);   // ten bytes each
     presetFolder().getChildFile ("Long.vtp").replaceWithText ("<VELTRANE_PRESET PresetName=\"" + tooLong + "\" Delay1Feedback=\"0.25\"/>");
+    VeltraneAudioProcessor writer, reader;
+    processBlock (writer, programChange (1, 0));
+    processBlock (writer);
 
-    for (const auto& source : { "preset", "typed" })
-    {
-        VeltraneAudioProcessor writer;
-        writer.setParameter (Param::Delay1Feedback, 0.25f);
-        if (juce::String (source) == "preset")
-        {
-            processBlock (writer, programChange (1, 0));
-            processBlock (writer);
-        }
-        else
-            writer.setPresetName (widest);
-
-        const auto expected = (juce::String (source) == "preset" ? tooLong : widest).substring (0, maxPresetNameLength);
-        EXPECT_EQ (writer.getPresetName(), expected) << source;
-
-        const auto chunk = chunkOf (writer);
-        VeltraneAudioProcessor reader;
-        reader.setStateInformation (chunk.getData(), (int) chunk.getSize());
-        EXPECT_EQ (reader.getPresetName(), expected) << source;
-        EXPECT_EQ (reader.getParameter (Param::Delay1Feedback), 0.25f) << source;
-    }
+    const auto chunk = chunkOf (writer);
+    reader.setStateInformation (chunk.getData(), (int) chunk.getSize());
+    EXPECT_EQ (reader.getPresetName(), tooLong.substring (0, maxPresetNameLength));
+    EXPECT_EQ (reader.getParameter (Param::Delay1Feedback), 0.25f);
+    writer.setPresetName (tooLong + "typed");
+    EXPECT_EQ (writer.getPresetName(), reader.getPresetName());
 }
