@@ -29,6 +29,7 @@ target_sources (Veltrane PRIVATE
     persistence/FactoryPresets.cpp
     persistence/Preferences.cpp
     persistence/PresetLibrary.cpp
+    persistence/SafeFile.cpp
     persistence/SafeXml.cpp
     persistence/StateChunk.cpp
     editor/PanelLayout.cpp

@@ -1,9 +1,8 @@
 #include "PresetLibrary.h"
 
 #include "FactoryPresets.h"
+#include "SafeFile.h"
 #include "SafeXml.h"
-
-#include <filesystem>
 
 namespace veltrane
 {
@@ -25,6 +24,18 @@ namespace
     }
 
     bool isWindows (int platform) noexcept { return platform == 0; }
+
+    // Earlier versions saved through "<name>_temp<hex>.vtp" beside the preset, the hex
+    // being a random 32-bit number, and a crash could leave one behind. A name counts
+    // as such a leftover only with all eight digits, in lower case, while the preset
+    // it was replacing is listed too; any other name, however alike, stays listed.
+    bool isLeftoverOfSave (const juce::String& name, const juce::StringArray& listed)
+    {
+        const auto stem = name.dropLastCharacters (13);
+
+        return name.length() > 13 && name.substring (stem.length(), stem.length() + 5) == "_temp"
+            && name.getLastCharacters (8).containsOnly ("0123456789abcdef") && listed.contains (stem);
+    }
 }
 
 bool writePresetFile (const juce::File& target, const juce::String& presetName, const ParameterValues& values)
@@ -35,12 +46,12 @@ bool writePresetFile (const juce::File& target, const juce::String& presetName, 
     for (int i = 0; i < Param::count; ++i)
         element.setAttribute (parameterTable[(size_t) i].identifier, formatValue ((double) values[(size_t) i]));
 
-    return element.writeTo (target, [] {
-        juce::XmlElement::TextFormat format;
-        format.dtd = " ";
-        format.customEncoding = "UTF-8";
-        return format;
-    }());
+    juce::XmlElement::TextFormat format;
+    format.dtd = " ";
+    format.customEncoding = "UTF-8";
+    juce::MemoryOutputStream text;
+    element.writeTo (text, format);
+    return replaceFileContents (target, text.getData(), text.getDataSize());
 }
 
 std::optional<PresetContents> readPresetText (const juce::String& text)
@@ -54,47 +65,21 @@ std::optional<PresetContents> readPresetDocument (std::unique_ptr<juce::XmlEleme
         return {};
 
     static const auto names = presetAttributeNames();
-    const auto found = findAttributes (*element, names);
+    const auto found = takeAttributes (*element, names);
 
     PresetContents contents;
 
     for (size_t i = 0; i < (size_t) Param::count; ++i)
-        if (const auto* value = found[i])
+        if (const auto& value = found[i])
             contents.values[i] = value->getDoubleValue();
 
-    const auto* presetName = found.back();
-    contents.presetName = presetName != nullptr ? *presetName : juce::String (" ");
+    contents.presetName = limitPresetName (found.back().value_or (" "));
     return contents;
 }
 
 std::optional<PresetContents> readPresetFile (const juce::File& file)
 {
-    // Only a plain file is opened: a pipe or a device in the folder would block or
-    // never end. The size is checked before anything is read.
-    std::error_code error;
-    const std::filesystem::path path (file.getFullPathName().toStdString());
-
-    if (! std::filesystem::is_regular_file (path, error))
-        return {};
-
-    const auto size = std::filesystem::file_size (path, error);
-
-    if (error || size > (std::uintmax_t) maxDocumentBytes)
-        return {};
-
-    juce::FileInputStream stream (file);
-
-    if (! stream.openedOk())
-        return {};
-
-    // At most one byte more than allowed, in case the file grew since it was measured.
-    juce::MemoryBlock bytes;
-    stream.readIntoMemoryBlock (bytes, maxDocumentBytes + 1);
-
-    if (bytes.getSize() > (size_t) maxDocumentBytes)
-        return {};
-
-    return readPresetDocument (parseDocument (static_cast<const char*> (bytes.getData()), bytes.getSize()));
+    return readPresetDocument (parseDocumentFile (file));
 }
 
 void PresetLibrary::chooseRoot (juce::SystemStats::OperatingSystemType system)
@@ -156,6 +141,7 @@ void PresetLibrary::initialise (const juce::String& productName, const juce::Str
 void PresetLibrary::rescan()
 {
     presetNames.clear();
+    presetFiles.clear();
 
     if (presetFolder.isEmpty())
         return;
@@ -171,20 +157,33 @@ void PresetLibrary::rescan()
         const auto file = entry.getFile();
 
         if (! exactCase || file.getFileName().endsWith ("." + extension))
+        {
             presetNames.add (file.getFileNameWithoutExtension());
+            presetFiles.add (file.getFileName());
+        }
+    }
+
+    const auto scanned = presetNames;
+
+    for (int i = presetNames.size(); --i >= 0;)
+    {
+        if (isLeftoverOfSave (presetNames[i], scanned))
+        {
+            presetNames.remove (i);
+            presetFiles.remove (i);
+        }
     }
 }
 
 juce::String PresetLibrary::getPresetPath (int index) const
 {
-    if (presetFolder.isEmpty())
+    // A negative index (a typed name that matches no entry) or an empty list names no
+    // preset: the empty name is no preset's name.
+    if (presetFolder.isEmpty() || presetFiles.isEmpty() || index < 0)
         return {};
 
-    if (index >= presetNames.size())
-        index = presetNames.size() - 1;
-
-    // Listed names are names of files found in the folder, so they need no check.
-    return presetFolder + (index >= 0 ? presetNames[index] : juce::String()) + "." + extension;
+    // The file found by the scan: a file named ".vtp" is listed as ".vtp" and loads.
+    return presetFolder + presetFiles[juce::jmin (index, presetFiles.size() - 1)];
 }
 
 juce::String PresetLibrary::getPresetPath (const juce::String& name) const
@@ -197,10 +196,11 @@ juce::String PresetLibrary::getPresetPath (const juce::String& name) const
 
 bool PresetLibrary::isSafePresetName (const juce::String& name) const
 {
-    if (name.containsAnyOf ("/\\"))
+    if (name.isEmpty() || name.containsChar ('/'))
         return false;
 
-    return ! (isWindows (platform) && name.containsChar (':'));
+    // Elsewhere both are ordinary characters of a file name: "AC\DC" is a preset.
+    return ! (isWindows (platform) && name.containsAnyOf ("\\:"));
 }
 
 } // namespace veltrane

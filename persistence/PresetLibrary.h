@@ -18,13 +18,13 @@ struct PresetContents
     std::array<std::optional<double>, Param::count> values;         // absent: keep the current value
 };
 
-// Writes through a temporary file that then replaces target, in JUCE's file layout:
+// Writes target whole or not at all (replaceFileContents), in JUCE's file layout:
 // declaration, an empty line, a line holding one space, then the element with its
 // attributes wrapped after 60 characters. Returns whether the file was written.
 bool writePresetFile (const juce::File& target, const juce::String& presetName, const ParameterValues& values);
 
-// Nothing for a missing file, anything but a plain file, a file larger than
-// maxDocumentBytes, text that is not XML or another root tag.
+// Nothing for a missing file, a file parseDocumentFile refuses or another root tag.
+// The name is cut to maxPresetNameLength characters.
 std::optional<PresetContents> readPresetFile (const juce::File& file);
 std::optional<PresetContents> readPresetText (const juce::String& text);
 std::optional<PresetContents> readPresetDocument (std::unique_ptr<juce::XmlElement> element);
@@ -44,23 +44,25 @@ public:
     void initialise (const juce::String& productName, const juce::String& fileExtension);
 
     // Scans presetFolder again: the "*.extension" files directly in it, in the
-    // order the file system lists them, names without the extension.
+    // order the file system lists them, names without the extension. Leftovers of
+    // interrupted saves of earlier versions are not listed (see isLeftoverOfSave).
     void rescan();
 
     juce::StringArray getPresetNames() const { return presetNames; }
 
-    // Entry index of the list (the last entry beyond the end); a negative index or
-    // an empty list names the file with an empty name. Empty without a folder.
+    // The file of entry index of the list (the last entry beyond the end); empty for
+    // a negative index, an empty list or no folder.
     juce::String getPresetPath (int index) const;
 
     // presetFolder + name + "." + extension, or empty when there is no folder or the
-    // name is unsafe (see isSafePresetName).
+    // name is refused (see isSafePresetName).
     juce::String getPresetPath (const juce::String& name) const;
 
-    // A name is safe when its file stays directly inside the preset folder: it holds
-    // no path separator ('/' or '\\'), and on Windows no ':' (drive letters and
-    // alternate streams). An empty name, "." or ".." is safe: with the extension they
-    // name ".vtp", "..vtp" or "...vtp" inside the folder.
+    // A name is safe when it is not empty (".vtp" would be a hidden file that the
+    // list could only show as ".vtp") and its file stays directly inside the preset
+    // folder: it holds no '/', and on Windows no '\\' or ':' (drive letters and
+    // alternate streams). "." and ".." are safe: with the extension they name "..vtp"
+    // and "...vtp" inside the folder.
     bool isSafePresetName (const juce::String& name) const;
 
     int platform = noPlatform;
@@ -68,6 +70,7 @@ public:
     juce::String presetFolder;    // presetRoot + separator + product + separator
     juce::String extension;       // without the dot
     juce::StringArray presetNames;
+    juce::StringArray presetFiles;   // the file name behind each entry of presetNames
 };
 
 } // namespace veltrane

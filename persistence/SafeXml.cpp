@@ -1,6 +1,8 @@
 #include "SafeXml.h"
 
+#include <algorithm>
 #include <cstring>
+#include <filesystem>
 #include <locale>
 #include <sstream>
 
@@ -9,6 +11,9 @@ namespace veltrane
 
 namespace
 {
+    // UTF-16 takes up to twice the bytes of the same text in UTF-8.
+    constexpr int maxFileBytes = 2 * maxDocumentBytes;
+
     // Strict UTF-8: no stray continuation byte, no truncated, overlong or surrogate
     // sequence, nothing above U+10FFFF. Stops at a zero byte.
     bool isStrictUtf8 (const unsigned char* bytes, size_t numBytes)
@@ -45,10 +50,54 @@ namespace
         return true;
     }
 
+    // Little- or big-endian UTF-16 as UTF-8, up to a zero character; nothing for an
+    // odd number of bytes or a surrogate without its partner.
+    std::optional<std::string> utf16ToUtf8 (const unsigned char* bytes, size_t numBytes, bool bigEndian)
+    {
+        if (numBytes % 2 != 0)
+            return {};
+
+        const auto unitAt = [&] (size_t i) {
+            return (juce::uint32) (bigEndian ? (bytes[i] << 8) | bytes[i + 1] : (bytes[i + 1] << 8) | bytes[i]);
+        };
+
+        std::string text;
+        text.reserve (numBytes);
+
+        for (size_t i = 0; i < numBytes; i += 2)
+        {
+            auto code = unitAt (i);
+
+            if (code == 0)
+                break;
+
+            if (code >= 0xdc00 && code <= 0xdfff)
+                return {};
+
+            if (code >= 0xd800 && code <= 0xdbff)
+            {
+                const auto low = i + 2 < numBytes ? unitAt (i + 2) : 0;
+
+                if (low < 0xdc00 || low > 0xdfff)
+                    return {};
+
+                code = 0x10000 + ((code - 0xd800) << 10) + (low - 0xdc00);
+                i += 2;
+            }
+
+            char encoded[4];
+            const auto length = juce::CharPointer_UTF8::getBytesRequiredFor ((juce::juce_wchar) code);
+            juce::CharPointer_UTF8 (encoded).write ((juce::juce_wchar) code);
+            text.append (encoded, length);
+        }
+
+        return text;
+    }
+
     // A strict reading of the document's shape: an optional declaration, comments,
-    // processing instructions and a DOCTYPE without internal subset, then one element
-    // whose tags, attributes, references, text, comments and CDATA are well formed,
-    // nested at most maxElementDepth deep. JUCE's parser is lenient with malformed
+    // processing instructions and a DOCTYPE, then one element whose tags,
+    // attributes, references, text, comments and CDATA are well formed, nested at
+    // most maxElementDepth deep. JUCE's parser is lenient with malformed
     // text and then can loop forever or read past the end, so it only ever sees
     // documents that pass here.
     class ShapeCheck
@@ -63,8 +112,11 @@ namespace
 
             if (startsWith ("<!DOCTYPE"))
             {
-                while (*p != 0 && *p != '>' && *p != '[' && *p != '<')
+                for (p += 9; *p != 0 && *p != '>' && *p != '[' && *p != '<';)
                     ++p;
+
+                if (*p == '[' && ! internalSubset())
+                    return false;
 
                 if (*p++ != '>' || ! misc())
                     return false;
@@ -94,6 +146,75 @@ namespace
 
             p = found + std::strlen (terminator);
             return true;
+        }
+
+        // Skips to the end of terminator, refusing the angle brackets that JUCE would
+        // count before it.
+        bool skipPastWithoutBrackets (const char* terminator)
+        {
+            const auto* found = std::strstr (p, terminator);
+
+            if (found == nullptr || std::find_if (p, found, [] (char c) { return c == '<' || c == '>'; }) != found)
+                return false;
+
+            p = found + std::strlen (terminator);
+            return true;
+        }
+
+        // The declarations, comments, processing instructions and parameter-entity
+        // references between '[' and ']', then the space before the closing '>'.
+        // Nothing declared is ever expanded: only the predefined entities and
+        // character numbers pass in the document. JUCE finds the end of the DOCTYPE
+        // by counting angle brackets, so none may stand in a literal or a comment.
+        bool internalSubset()
+        {
+            for (++p;;)
+            {
+                skipSpace();
+
+                if (*p == ']')
+                {
+                    ++p;
+                    skipSpace();
+                    return true;
+                }
+
+                if (*p == '%')
+                {
+                    ++p;
+                    if (name() == nullptr || *p++ != ';')
+                        return false;
+                }
+                else if (startsWith ("<!--") || startsWith ("<?"))
+                {
+                    p += 2;
+                    if (! skipPastWithoutBrackets (p[-1] == '?' ? "?>" : "-->"))
+                        return false;
+                }
+                else if (startsWith ("<!"))
+                {
+                    for (p += 2; *p != '>'; ++p)
+                    {
+                        if (*p == '"' || *p == '\'')
+                        {
+                            const auto* end = std::strchr (p + 1, *p);
+                            if (end == nullptr || std::find_if (p, end, [] (char c) { return c == '<' || c == '>'; }) != end)
+                                return false;
+                            p = end;
+                        }
+                        else if (*p == 0 || *p == '<' || *p == '[' || *p == ']')
+                        {
+                            return false;
+                        }
+                    }
+
+                    ++p;
+                }
+                else
+                {
+                    return false;
+                }
+            }
         }
 
         // Whitespace, comments and processing instructions.
@@ -285,12 +406,7 @@ std::unique_ptr<juce::XmlElement> parseDocument (const juce::String& text)
 
     // Parsed from a string, the document has no input source, so a DTD naming an
     // external file reads nothing.
-    auto element = juce::XmlDocument::parse (text);
-
-    if (element != nullptr && element->getNumAttributes() > maxAttributes)
-        return {};
-
-    return element;
+    return juce::XmlDocument::parse (text);
 }
 
 std::unique_ptr<juce::XmlElement> parseDocument (const char* utf8, size_t numBytes)
@@ -304,18 +420,61 @@ std::unique_ptr<juce::XmlElement> parseDocument (const char* utf8, size_t numByt
     return parseDocument (juce::String (juce::CharPointer_UTF8 (static_cast<const char*> (text.getData()))));
 }
 
-std::vector<const juce::String*> findAttributes (const juce::XmlElement& element, const juce::StringArray& names)
+std::unique_ptr<juce::XmlElement> parseDocumentFile (const juce::File& file)
 {
-    std::vector<const juce::String*> found ((size_t) names.size(), nullptr);
-    const auto count = juce::jmin (element.getNumAttributes(), maxAttributes);
+    std::error_code error;
+    const std::filesystem::path path (file.getFullPathName().toStdString());
 
-    for (int i = 0; i < count; ++i)
+    if (! std::filesystem::is_regular_file (path, error))
+        return {};
+
+    const auto size = std::filesystem::file_size (path, error);
+
+    if (error || size > (std::uintmax_t) maxFileBytes)
+        return {};
+
+    juce::FileInputStream stream (file);
+
+    if (! stream.openedOk())
+        return {};
+
+    // At most one byte more than allowed, in case the file grew since it was measured.
+    juce::MemoryBlock bytes;
+    stream.readIntoMemoryBlock (bytes, maxFileBytes + 1);
+
+    if (bytes.getSize() > (size_t) maxFileBytes)
+        return {};
+
+    const auto* data = static_cast<const unsigned char*> (bytes.getData());
+    const auto numBytes = bytes.getSize();
+
+    if (numBytes >= 3 && data[0] == 0xef && data[1] == 0xbb && data[2] == 0xbf)
+        return parseDocument (reinterpret_cast<const char*> (data + 3), numBytes - 3);
+
+    const auto littleEndian = numBytes >= 2 && data[0] == 0xff && data[1] == 0xfe;
+    const auto bigEndian = numBytes >= 2 && data[0] == 0xfe && data[1] == 0xff;
+
+    if (littleEndian || bigEndian)
     {
-        const auto& attributeName = element.getAttributeName (i);
+        const auto utf8 = utf16ToUtf8 (data + 2, numBytes - 2, bigEndian);
+        return utf8.has_value() ? parseDocument (utf8->data(), utf8->size()) : nullptr;
+    }
 
+    return parseDocument (reinterpret_cast<const char*> (data), numBytes);
+}
+
+std::vector<std::optional<juce::String>> takeAttributes (juce::XmlElement& element, const juce::StringArray& names)
+{
+    std::vector<std::optional<juce::String>> found ((size_t) names.size());
+
+    // Attribute names are never empty, so an empty first name means none is left.
+    for (juce::String attributeName; (attributeName = element.getAttributeName (0)).isNotEmpty();)
+    {
         for (int j = 0; j < names.size(); ++j)
-            if (found[(size_t) j] == nullptr && attributeName.equalsIgnoreCase (names[j]))
-                found[(size_t) j] = &element.getAttributeValue (i);
+            if (! found[(size_t) j].has_value() && attributeName.equalsIgnoreCase (names[j]))
+                found[(size_t) j] = element.getAttributeValue (0);
+
+        element.removeAttribute (juce::Identifier (attributeName));
     }
 
     return found;

@@ -3,6 +3,7 @@
 #include <juce_core/juce_core.h>
 
 #include <memory>
+#include <optional>
 #include <vector>
 
 namespace veltrane
@@ -15,14 +16,12 @@ constexpr int maxDocumentBytes = 1 << 20;
 // Deepest element nesting taken. Our documents are one element without children.
 constexpr int maxElementDepth = 32;
 
-// Most attributes taken on the document element; ours carry 34 or 67. JUCE finds
-// an attribute by walking a list, so a bound keeps the lookups below cheap.
-constexpr int maxAttributes = 1024;
-
 // The document element of text, or null when the text is larger than
-// maxDocumentBytes, nests elements deeper than maxElementDepth, declares entities,
-// is not XML, or whose element has more than maxAttributes attributes. JUCE's parser recurses once per nesting level and expands declared
-// entities recursively, so those documents are refused before it runs. Any thread.
+// maxDocumentBytes, nests elements deeper than maxElementDepth, refers to an entity
+// other than the five predefined ones, or is not XML. JUCE's parser recurses once
+// per nesting level and expands declared entities recursively, so those documents
+// are refused before it runs; a DOCTYPE, with an internal subset too, is taken and
+// nothing declared in it is ever expanded. Any thread.
 std::unique_ptr<juce::XmlElement> parseDocument (const juce::String& text);
 
 // The document element of numBytes bytes of UTF-8 text (ending early at a zero
@@ -31,9 +30,18 @@ std::unique_ptr<juce::XmlElement> parseDocument (const juce::String& text);
 // miscounts an overlong zero.
 std::unique_ptr<juce::XmlElement> parseDocument (const char* utf8, size_t numBytes);
 
+// The document element of a file as editors save it: UTF-8 with or without a
+// byte-order mark, or UTF-16 in either byte order after its mark. Null for anything
+// but a plain file (a pipe or a device would block or never end), a file of more
+// than twice maxDocumentBytes (UTF-16 takes up to twice the bytes of its UTF-8),
+// malformed UTF-16 and whatever parseDocument refuses.
+std::unique_ptr<juce::XmlElement> parseDocumentFile (const juce::File& file);
+
 // For each of names, the value of the first attribute of element whose name equals
-// it ignoring the case of letters, or null when there is none.
-std::vector<const juce::String*> findAttributes (const juce::XmlElement& element, const juce::StringArray& names);
+// it ignoring the case of letters, or nothing. Every attribute is taken off element
+// on the way, so a document with very many unknown attributes costs time in
+// proportion to its length: JUCE walks its list to reach an attribute by index.
+std::vector<std::optional<juce::String>> takeAttributes (juce::XmlElement& element, const juce::StringArray& names);
 
 // A value as "%.9g" writes it, with a full stop whatever the locale: nine
 // significant digits bring every single-precision value back unchanged.

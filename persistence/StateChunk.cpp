@@ -31,6 +31,11 @@ namespace
     }
 }
 
+juce::String limitPresetName (const juce::String& name)
+{
+    return name.length() > maxPresetNameLength ? name.substring (0, maxPresetNameLength) : name;
+}
+
 juce::String controllerKey (int index)
 {
     return juce::String (parameterTable[(size_t) index].identifier) + "CC";
@@ -95,21 +100,20 @@ std::optional<StateContents> readStateChunk (const void* data, int sizeInBytes)
         return {};
 
     static const auto names = stateAttributeNames();
-    const auto found = findAttributes (*element, names);
+    const auto found = takeAttributes (*element, names);
 
     StateContents contents;
 
     for (size_t i = 0; i < (size_t) Param::count; ++i)
     {
-        if (const auto* value = found[i])
+        if (const auto& value = found[i])
             contents.values[i] = value->getDoubleValue();
 
-        const auto* controller = found[i + (size_t) Param::count];
-        contents.midiControllers[i] = controller != nullptr ? controller->getIntValue() : -1;
+        const auto& controller = found[i + (size_t) Param::count];
+        contents.midiControllers[i] = controller.has_value() ? controller->getIntValue() : -1;
     }
 
-    const auto* presetName = found.back();
-    contents.presetName = presetName != nullptr ? *presetName : juce::String (" ");
+    contents.presetName = limitPresetName (found.back().value_or (" "));
     return contents;
 }
 

@@ -1,6 +1,5 @@
 #include "VeltraneAudioProcessor.h"
 
-#include "../persistence/Preferences.h"
 #include "../persistence/StateChunk.h"
 
 namespace veltrane
@@ -21,10 +20,13 @@ void VeltraneAudioProcessor::openPersistentState()
         presetNames = presetLibrary.getPresetNames();
     }
 
-    properties = std::make_unique<juce::PropertiesFile> (preferencesOptions());
+    properties = std::make_unique<PreferencesFile> (preferencesOptions());
 
     for (int i = 0; i < Param::count; ++i)
+    {
+        properties->setDefaultValue (controllerKey (i), -1);
         parameters[(size_t) i].midiController.store (properties->getIntValue (controllerKey (i), -1));
+    }
 
     lastEditorWidth = (float) properties->getDoubleValue (lastWidthKey, defaultEditorWidth);
     lastEditorHeight = (float) properties->getDoubleValue (lastHeightKey, defaultEditorHeight);
@@ -83,15 +85,17 @@ juce::String VeltraneAudioProcessor::getPresetName() const
 
 void VeltraneAudioProcessor::setPresetName (const juce::String& newName)
 {
+    const auto limited = limitPresetName (newName);
     const std::lock_guard<std::mutex> lock (presetLock);
-    presetName = newName;
+    presetName = limited;
 }
 
-void VeltraneAudioProcessor::savePreset()
+bool VeltraneAudioProcessor::savePreset()
 {
     const auto name = getPresetName();
-    // Empty for a name that would leave the preset folder: nothing is written.
+    // Empty for an empty name or one that would leave the preset folder.
     const auto path = presetLibrary.getPresetPath (name);
+    auto saved = false;
 
     if (path.isNotEmpty())
     {
@@ -100,7 +104,7 @@ void VeltraneAudioProcessor::savePreset()
         for (int i = 0; i < Param::count; ++i)
             values[(size_t) i] = getParameter (i);
 
-        writePresetFile (juce::File (path), name, values);
+        saved = writePresetFile (juce::File (path), name, values);
     }
 
     {
@@ -110,6 +114,7 @@ void VeltraneAudioProcessor::savePreset()
     }
 
     presetListChanged.store (true);
+    return saved;
 }
 
 void VeltraneAudioProcessor::applyPresetValues (const PresetContents& preset)

@@ -2,6 +2,7 @@
 
 #include "PluginParameter.h"
 #include "../dsp/Engine.h"
+#include "../persistence/Preferences.h"
 #include "../persistence/PresetLibrary.h"
 
 #include <juce_audio_processors/juce_audio_processors.h>
@@ -108,8 +109,13 @@ public:
     // tries it and leaves a preset load pending for the next block when it cannot.
     juce::StringArray getPresetNames() const;
     juce::String getPresetName() const;
+    // Cut to maxPresetNameLength characters, so every state stays readable.
     void setPresetName (const juce::String& newName);
-    void savePreset();
+    // Writes the current values under the current name, then rescans the list and
+    // raises presetListChanged, whether or not the write succeeded. False when
+    // nothing was written: a name that is empty or would leave the preset folder, or
+    // a failed write, which leaves an existing preset of that name as it was.
+    bool savePreset();
     // Applies the preset file at path. Message thread or tests: it waits for the
     // lock to set the name; the audio thread loads through loadRequestedPreset.
     void loadPreset (const juce::String& path);
@@ -149,7 +155,7 @@ private:
     juce::Random randomiser;
     std::atomic<int> lastParameterIndex { -1 };   // -1 until a parameter is set
 
-    std::unique_ptr<juce::PropertiesFile> properties;   // per-user preferences
+    std::unique_ptr<PreferencesFile> properties;         // per-user preferences
     mutable std::mutex presetLock;                       // guards the three below
     PresetLibrary presetLibrary;
     juce::StringArray presetNames;                       // copy of the library's list for the editor
