@@ -22,6 +22,7 @@ juce::StringArray sorted (juce::StringArray names) { names.sort (false); return 
 TEST (SafeSave, FileSizeLimitLeavesPresetAndPreferencesWhole)
 {
     TemporaryHome home;
+    presetFolder().createDirectory();   // an existing folder: no factory presets
     std::make_unique<VeltraneAudioProcessor>()->setLastEditorSize (1200.0f, 600.0f);   // writes the preferences
     auto processor = std::make_unique<VeltraneAudioProcessor>();
     processor->setPresetName ("Pad");
@@ -59,6 +60,7 @@ TEST (SafeSave, FileSizeLimitLeavesPresetAndPreferencesWhole)
 TEST (SafeSave, SavesInProgressAndTheirLeftoversAreNeverListed)
 {
     TemporaryHome home;
+    presetFolder().createDirectory();   // an existing folder: no factory presets
     VeltraneAudioProcessor saver;
     saver.setPresetName ("Pad");
     saver.savePreset();
@@ -92,6 +94,7 @@ TEST (SafeSave, SavesInProgressAndTheirLeftoversAreNeverListed)
 TEST (SafeSave, BackslashNamesSaveAndTheEmptyNameIsNoPreset)
 {
     TemporaryHome home;
+    presetFolder().createDirectory();   // an existing folder: no factory presets
     {
         VeltraneAudioProcessor processor;
         processor.setParameter (Param::Delay1Feedback, 0.25f);
