@@ -53,6 +53,16 @@ float HostParameter::getValueForText (const juce::String& text) const
         return record.currentValue.load();
     }
 
+    // getFloatValue reads text without a number as 0, which would jump the
+    // parameter to (or towards) its minimum: such text leaves the value alone.
+    auto start = text.trimStart().getCharPointer();
+    if (*start == '+' || *start == '-')
+        ++start;
+    if (*start == '.')
+        ++start;
+    if (! start.isDigit())
+        return record.currentValue.load();
+
     const auto physical = juce::jlimit (record.minimum, record.maximum, text.trim().getFloatValue());
     return juce::jlimit (0.0f, 1.0f, record.physicalToNormalised (physical));
 }

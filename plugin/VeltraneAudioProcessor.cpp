@@ -34,10 +34,11 @@ const juce::String VeltraneAudioProcessor::getName() const
 
 bool VeltraneAudioProcessor::isBusesLayoutSupported (const BusesLayout& layouts) const
 {
-    // Exactly one in / one out or two in / two out: the engine holds two channels.
-    const auto in = layouts.getMainInputChannelSet();
-    const auto out = layouts.getMainOutputChannelSet();
-    return in == out && (in == juce::AudioChannelSet::mono() || in == juce::AudioChannelSet::stereo());
+    // One in / one out or two in / two out, whatever the host calls the channels
+    // (stereo, a surround pair, two discrete channels): the engine holds two channels
+    // and treats them alike.
+    const auto in = layouts.getMainInputChannels();
+    return in == layouts.getMainOutputChannels() && (in == 1 || in == 2);
 }
 
 double VeltraneAudioProcessor::getTailLengthSeconds() const

@@ -32,6 +32,8 @@ public:
     void releaseResources() override {}
     void processBlock (juce::AudioBuffer<float>& buffer, juce::MidiBuffer& midiMessages) override;
     using juce::AudioProcessor::processBlock;
+    void processBlockBypassed (juce::AudioBuffer<float>& buffer, juce::MidiBuffer& midiMessages) override;
+    using juce::AudioProcessor::processBlockBypassed;
     void reset() override {}
     bool isBusesLayoutSupported (const BusesLayout& layouts) const override;
     // How long echoes ring on after the input stops, from the current delay times and
@@ -102,6 +104,9 @@ public:
     void handleControlChange (int controllerNumber, int controllerValue);
     // A MIDI program change: the preset of that number loads at the next block.
     void requestPresetLoad (int presetIndex) noexcept;
+    // Serves a program change or a control change from a block's MIDI; false for any
+    // other message. Audio thread.
+    bool handleProgramOrControlChange (const juce::uint8* data, int numBytes);
 
     // Preset library and preferences. presetName and the preset lists are guarded by
     // presetLock: the message and host threads take it, the audio thread only ever
