@@ -2,6 +2,7 @@
 
 #include "PluginParameter.h"
 #include "../dsp/Engine.h"
+#include "../dsp/SeededRandom.h"
 #include "../persistence/PresetLibrary.h"
 
 #include <juce_audio_processors/juce_audio_processors.h>
@@ -81,8 +82,12 @@ public:
     // also arms or forgets a MIDI binding when learn or unlearn mode is on.
     void setParameterFromControl (int index, float newValue, bool fromEditor);
 
-    juce::String getLastParameterName() const;
-    juce::String getLastParameterText() const;
+    // Name and display text of the parameter set last, from any thread; empty until
+    // one is set.
+    struct LastParameter { juce::String name, text; };
+    LastParameter getLastParameter() const;
+    juce::String getLastParameterName() const { return getLastParameter().name; }
+    juce::String getLastParameterText() const { return getLastParameter().text; }
 
     PluginParameter& getParameterRecord (int index) noexcept { return parameters[(size_t) index]; }
     const PluginParameter& getParameterRecord (int index) const noexcept { return parameters[(size_t) index]; }
@@ -95,7 +100,7 @@ public:
     // Randomize off. Audio thread, at a block start.
     void randomize();
     // Fixes the Randomize generator's seed, for reproducible renders and tests.
-    void seedRandomiser (juce::int64 seed) { randomiser.setSeed (seed); }
+    void seedRandomiser (juce::int64 seed) { randomiser = SeededRandom (seed); }
 
     // Block-start requests: a pending preset load, a clear of all MIDI bindings and
     // Randomize, in that order. Audio thread.
@@ -151,7 +156,7 @@ private:
     // Two channels of delay lines, envelope followers and LFOs; each LFO's "Sample & Hold"
     // table is drawn from its own randomly seeded generator.
     Engine engine { (uint64_t) juce::Random().nextInt64() };
-    juce::Random randomiser;
+    SeededRandom randomiser { juce::Random().nextInt64() };   // seeded randomly, as Randomize's dice
     std::atomic<int> lastParameterIndex { -1 };   // -1 until a parameter is set
 
     std::unique_ptr<juce::PropertiesFile> properties;   // per-user preferences
