@@ -109,9 +109,6 @@ public:
     void handleControlChange (int controllerNumber, int controllerValue);
     // A MIDI program change: the preset of that number loads at the next block.
     void requestPresetLoad (int presetIndex) noexcept;
-    // Serves a program change or a control change from a block's MIDI; false for any
-    // other message. Audio thread.
-    bool handleProgramOrControlChange (const juce::uint8* data, int numBytes);
 
     // Preset library and preferences. presetName and the preset lists are guarded by
     // presetLock: the message and host threads take it, the audio thread only ever
@@ -147,6 +144,9 @@ private:
     // The preset numbered presetToLoad, at a block start; clears presetLoadPending
     // once served and keeps it set when the preset lock is busy. Audio thread.
     void loadRequestedPreset();
+    // Serves a program change or a control change from a block's MIDI; false for any
+    // other message. Audio thread.
+    bool handleProgramOrControlChange (const juce::uint8* data, int numBytes);
     void applyPresetValues (const PresetContents& preset);
     // Constructor and destructor steps of the preset library and the preferences.
     void openPersistentState();

@@ -10,25 +10,15 @@ using namespace veltrane;
 TEST (ProcessorAnswers, LayoutsAreJudgedByChannelCount)
 {
     using Set = juce::AudioChannelSet;
-    const Set surroundPair = Set::channelSetWithChannels ({ Set::leftSurround, Set::rightSurround });
-    const struct { Set in, out; bool accepted; } cases[] = {
-        { Set::discreteChannels (2), Set::discreteChannels (2), true },
-        { Set::stereo(), Set::discreteChannels (2), true },
-        { surroundPair, surroundPair, true },
-        { Set::discreteChannels (1), Set::mono(), true },
-        { Set::createLCR(), Set::createLCR(), false },
-        { Set::discreteChannels (2), Set::mono(), false },
-        { Set::disabled(), Set::disabled(), false },
-    };
-
     VeltraneAudioProcessor processor;
-    for (const auto& c : cases)
-    {
-        juce::AudioProcessor::BusesLayout layout;
-        layout.inputBuses.add (c.in);
-        layout.outputBuses.add (c.out);
-        EXPECT_EQ (processor.checkBusesLayoutSupported (layout), c.accepted) << c.in.getDescription() << " / " << c.out.getDescription();
-    }
+    auto accepts = [&processor] (Set in, Set out) {
+        juce::AudioProcessor::BusesLayout layout { { in }, { out } };
+        return processor.checkBusesLayoutSupported (layout);
+    };
+    EXPECT_TRUE (accepts (Set::discreteChannels (2), Set::channelSetWithChannels ({ Set::leftSurround, Set::rightSurround })));
+    EXPECT_TRUE (accepts (Set::discreteChannels (1), Set::mono()));
+    EXPECT_FALSE (accepts (Set::createLCR(), Set::createLCR()));
+    EXPECT_FALSE (accepts (Set::disabled(), Set::disabled()));
 }
 
 TEST (ProcessorAnswers, RandomizeReachesTheLastChoice)
@@ -78,14 +68,13 @@ TEST (ProcessorAnswers, BypassedBlockPassesTheInputAndServesRequests)
     processor.setParameter (Param::Randomize, 1.0f);
 
     juce::AudioBuffer<float> buffer (2, 64);
-    for (int i = 0; i < 64; ++i)
-        for (int c = 0; c < 2; ++c)
-            buffer.setSample (c, i, 0.01f * (float) i);
+    buffer.clear();
+    buffer.setSample (1, 63, 0.5f);
     juce::MidiBuffer midi;
     midi.addEvent (juce::MidiMessage::controllerEvent (1, 7, 0), 10);
     processor.processBlockBypassed (buffer, midi);
 
-    EXPECT_EQ (buffer.getSample (1, 63), 0.01f * 63.0f);   // fully wet, unbypassed, this would be silence
+    EXPECT_EQ (buffer.getSample (1, 63), 0.5f);   // fully wet, unbypassed, this would be silence
     EXPECT_EQ (processor.getParameterText (Param::Randomize), "Off");
     EXPECT_EQ (processor.getParameter (Param::DryWet), 0.0f);
 }
