@@ -90,6 +90,12 @@ target_link_libraries (Veltrane
         juce::juce_recommended_config_flags
         juce::juce_recommended_warning_flags)
 
+get_target_property (VELTRANE_VERSION Veltrane JUCE_VERSION)
+add_custom_command (TARGET Veltrane_LV2 POST_BUILD
+    COMMAND "${CMAKE_COMMAND}" "-DMANIFEST=$<TARGET_FILE_DIR:Veltrane_LV2>/manifest.ttl" "-DURI=${VELTRANE_LV2_URI}"
+            "-DVERSION=${VELTRANE_VERSION}" -P "${CMAKE_CURRENT_LIST_DIR}/Lv2ManifestVersion.cmake"
+    VERBATIM)
+
 set (VELTRANE_ARTEFACTS "${CMAKE_BINARY_DIR}/Veltrane_artefacts/${CMAKE_BUILD_TYPE}")
 # Hosts list a VST2 plug-in by its file name too: ship it as Veltrane.so.
 set_target_properties (Veltrane_VST PROPERTIES PREFIX "")

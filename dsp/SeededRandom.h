@@ -1,14 +1,14 @@
 #pragma once
 
 #include <cstdint>
-#include <limits>
 
 namespace veltrane
 {
 
-// The 48-bit linear congruential generator of juce::Random, reproduced bit for bit so that
-// the engine's random tables can be built (and tested) without JUCE: a SeededRandom and a
-// juce::Random constructed with the same seed draw the same numbers.
+// The 48-bit linear congruential generator of juce::Random, without JUCE, for the engine's
+// random tables and for Randomize: a SeededRandom and a juce::Random constructed with the
+// same seed draw the same bits and the same floats, except that the few float draws that
+// round up to 1.0 stay 1.0 here.
 class SeededRandom
 {
 public:
@@ -23,12 +23,12 @@ public:
         return (uint32_t) (seed >> 16);
     }
 
-    // Uniform in [0, 1): the 32 bits as a float times 2^-32. The few draws that round up to
-    // 1.0 give the float just below 1, as juce::Random::nextFloat does.
+    // The 32 bits as a float times 2^-32: uniform over [0, 1], where the top 128 of the 2^32
+    // draws round to exactly 1.0 (juce::Random::nextFloat moves those just below 1). Kept,
+    // so that a choice parameter drawn by Randomize can land on its last entry.
     float nextFloat() noexcept
     {
-        const auto result = (float) nextBits() * 2.3283064e-10f;
-        return result == 1.0f ? 1.0f - std::numeric_limits<float>::epsilon() : result;
+        return (float) nextBits() * 2.3283064e-10f;
     }
 
     int64_t nextInt64() noexcept

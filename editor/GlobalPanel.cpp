@@ -135,8 +135,9 @@ void GlobalPanel::timerCallback()
         defaultsPending = false;
     }
 
-    lastNameLabel.setText (processor->getLastParameterName(), juce::dontSendNotification);
-    lastValueLabel.setText (processor->getLastParameterText(), juce::dontSendNotification);
+    const auto last = processor->getLastParameter();
+    lastNameLabel.setText (last.name, juce::dontSendNotification);
+    lastValueLabel.setText (last.text, juce::dontSendNotification);
 
     // Before the waveshaper knob is refreshed below, so Boost follows a change from
     // elsewhere one tick after the knob.

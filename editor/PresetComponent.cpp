@@ -86,7 +86,15 @@ void PresetComponent::timerCallback()
         refreshRequested = false;
     }
 
-    presetBox->setText (processor->getPresetName(), juce::dontSendNotification);
+    // JUCE delivers the box's change message asynchronously: writing the processor's
+    // name back before it arrives would lose what the user entered and request the
+    // preset shown before. The box follows the processor only while the user is not
+    // entering a name.
+    if (! userIsEnteringName())
+    {
+        shownName = processor->getPresetName();
+        presetBox->setText (shownName, juce::dontSendNotification);
+    }
 
     if (saveButton->getToggleState())
         saveButton->setToggleState (false, juce::dontSendNotification);
@@ -101,7 +109,17 @@ void PresetComponent::comboBoxChanged (juce::ComboBox* box)
     // the flag also sees the index. A typed name matches no item and gives -1.
     processor->presetToLoad.store (presetBox->getSelectedId() - 1);
     processor->presetLoadPending.store (true);
-    processor->setPresetName (presetBox->getText());
+    shownName = presetBox->getText();
+    processor->setPresetName (shownName);
+}
+
+bool PresetComponent::userIsEnteringName() const
+{
+    for (auto* child : presetBox->getChildren())
+        if (auto* text = dynamic_cast<juce::Label*> (child); text != nullptr && text->isBeingEdited())
+            return true;
+
+    return presetBox->getText() != shownName;
 }
 
 void PresetComponent::buttonClicked (juce::Button* button)

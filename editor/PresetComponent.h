@@ -29,8 +29,14 @@ public:
     void buttonClicked (juce::Button*) override;
 
 private:
+    // True while the box's text editor is open, and after the user has confirmed a name
+    // or picked an item until JUCE delivers the box's change message (the box then shows
+    // something other than shownName).
+    bool userIsEnteringName() const;
+
     VeltraneAudioProcessor* processor = nullptr;
     bool refreshRequested = true;   // the first tick fills the list
+    juce::String shownName;         // the processor's name as the box last showed it
     std::unique_ptr<juce::ComboBox> presetBox;
     std::unique_ptr<juce::TextButton> saveButton;
     std::unique_ptr<juce::TextButton> revealButton;

@@ -25,6 +25,8 @@ public:
     juce::String getName (int maximumStringLength) const override;
     juce::String getLabel() const override { return {}; }
     juce::String getText (float normalisedValue, int maximumStringLength) const override;
+    // A choice entry, or a number in the parameter's unit ("25", "25 %"); any other
+    // text keeps the current value.
     float getValueForText (const juce::String& text) const override;
     bool isDiscrete() const override;
     bool isBoolean() const override;

@@ -71,6 +71,17 @@ namespace
 
         return (float) position->getBpm().orFallback (0.0);
     }
+
+    // Calls handle (position, data, numBytes) for each event of at least two bytes inside
+    // the block, reading the raw bytes, so that no message object (nor a SysEx copy) is
+    // made. Events outside the block are ignored.
+    template <typename Handler>
+    void forEachEventInBlock (const juce::MidiBuffer& midiMessages, int numSamples, Handler&& handle)
+    {
+        for (const auto event : midiMessages)
+            if (event.samplePosition >= 0 && event.samplePosition < numSamples && event.numBytes >= 2)
+                handle (event.samplePosition, event.data, event.numBytes);
+    }
 }
 
 void VeltraneAudioProcessor::prepareToPlay (double sampleRate, int)
@@ -84,15 +95,6 @@ void VeltraneAudioProcessor::processBlock (juce::AudioBuffer<float>& buffer, juc
     const auto numSamples = buffer.getNumSamples();
     const auto numChannels = std::min ({ getTotalNumInputChannels(), buffer.getNumChannels(), Engine::numChannels });
 
-    // MIDI is read from the raw bytes, so that no message object (nor a SysEx copy) is made.
-    // Events outside the block are ignored.
-    auto eventsInBlock = [&midiMessages, numSamples] (auto&& handle)
-    {
-        for (const auto event : midiMessages)
-            if (event.samplePosition >= 0 && event.samplePosition < numSamples && event.numBytes >= 2)
-                handle (event.samplePosition, event.data, event.numBytes);
-    };
-
     // A note-on with velocity on MIDI channel 1 restarts LFO 1, on channel 2 LFO 2.
     auto restartedLfo = [] (const juce::uint8* data, int numBytes)
     {
@@ -103,7 +105,7 @@ void VeltraneAudioProcessor::processBlock (juce::AudioBuffer<float>& buffer, juc
     serveBlockStartRequests();
 
     bool lfoRestarted[2] = { false, false };
-    eventsInBlock ([&] (int, const juce::uint8* data, int numBytes) {
+    forEachEventInBlock (midiMessages, numSamples, [&] (int, const juce::uint8* data, int numBytes) {
         if (const auto lfo = restartedLfo (data, numBytes); lfo >= 0)
             lfoRestarted[lfo] = true;
     });
@@ -115,16 +117,14 @@ void VeltraneAudioProcessor::processBlock (juce::AudioBuffer<float>& buffer, juc
     auto* const* channels = buffer.getArrayOfWritePointers();
     int done = 0;
 
-    eventsInBlock ([&] (int position, const juce::uint8* data, int numBytes) {
+    forEachEventInBlock (midiMessages, numSamples, [&] (int position, const juce::uint8* data, int numBytes) {
         engine.process (channels, done, position);
         done = position;
-        const auto type = data[0] & 0xf0;
 
-        if (type == 0xc0)
-            requestPresetLoad (data[1]);
-        else if (type == 0xb0 && numBytes >= 3)
-            handleControlChange (data[1], data[2]);
-        else if (const auto lfo = restartedLfo (data, numBytes); lfo >= 0)
+        if (handleProgramOrControlChange (data, numBytes))
+            return;
+
+        if (const auto lfo = restartedLfo (data, numBytes); lfo >= 0)
             engine.restartLfo (lfo);
     });
 
@@ -132,6 +132,34 @@ void VeltraneAudioProcessor::processBlock (juce::AudioBuffer<float>& buffer, juc
 
     for (auto channel = numChannels; channel < buffer.getNumChannels(); ++channel)
         buffer.clear (channel, 0, numSamples);
+}
+
+void VeltraneAudioProcessor::processBlockBypassed (juce::AudioBuffer<float>& buffer, juce::MidiBuffer& midiMessages)
+{
+    // The host's soft bypass: the input passes unchanged and the engine rests, keeping
+    // its echoes, until the bypass ends. Requests from the editor, program changes and
+    // learned controllers are still served, so nothing asked for meanwhile is lost.
+    serveBlockStartRequests();
+
+    forEachEventInBlock (midiMessages, buffer.getNumSamples(), [this] (int, const juce::uint8* data, int numBytes) {
+        handleProgramOrControlChange (data, numBytes);
+    });
+
+    juce::AudioProcessor::processBlockBypassed (buffer, midiMessages);
+}
+
+bool VeltraneAudioProcessor::handleProgramOrControlChange (const juce::uint8* data, int numBytes)
+{
+    const auto type = data[0] & 0xf0;
+
+    if (type == 0xc0)
+        requestPresetLoad (data[1]);
+    else if (type == 0xb0 && numBytes >= 3)
+        handleControlChange (data[1], data[2]);
+    else
+        return false;
+
+    return true;
 }
 
 } // namespace veltrane

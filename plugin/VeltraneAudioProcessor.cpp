@@ -11,8 +11,6 @@ VeltraneAudioProcessor::VeltraneAudioProcessor()
                                 .withInput ("Input", juce::AudioChannelSet::stereo(), true)
                                 .withOutput ("Output", juce::AudioChannelSet::stereo(), true))
 {
-    randomiser.setSeedRandomly();
-
     for (int i = 0; i < Param::count; ++i)
         parameters[(size_t) i].initialise (parameterTable[(size_t) i]);
 
@@ -34,10 +32,11 @@ const juce::String VeltraneAudioProcessor::getName() const
 
 bool VeltraneAudioProcessor::isBusesLayoutSupported (const BusesLayout& layouts) const
 {
-    // Exactly one in / one out or two in / two out: the engine holds two channels.
-    const auto in = layouts.getMainInputChannelSet();
-    const auto out = layouts.getMainOutputChannelSet();
-    return in == out && (in == juce::AudioChannelSet::mono() || in == juce::AudioChannelSet::stereo());
+    // One in / one out or two in / two out, whatever the host calls the channels
+    // (stereo, a surround pair, two discrete channels): the engine holds two channels
+    // and treats them alike.
+    const auto in = layouts.getMainInputChannels();
+    return in == layouts.getMainOutputChannels() && (in == 1 || in == 2);
 }
 
 double VeltraneAudioProcessor::getTailLengthSeconds() const
@@ -95,16 +94,17 @@ void VeltraneAudioProcessor::setParameter (int index, float newValue)
     lastParameterIndex.store (index, std::memory_order_release);
 }
 
-juce::String VeltraneAudioProcessor::getLastParameterName() const
+VeltraneAudioProcessor::LastParameter VeltraneAudioProcessor::getLastParameter() const
 {
+    // One load of the index, so the name and the text belong to the same parameter
+    // however often other threads set parameters meanwhile.
     const auto index = lastParameterIndex.load (std::memory_order_acquire);
-    return index >= 0 ? parameters[(size_t) index].name : juce::String();
-}
 
-juce::String VeltraneAudioProcessor::getLastParameterText() const
-{
-    const auto index = lastParameterIndex.load (std::memory_order_acquire);
-    return index >= 0 ? parameters[(size_t) index].getText() : juce::String();
+    if (index < 0)
+        return {};
+
+    const auto& record = parameters[(size_t) index];
+    return { record.name, record.getText() };
 }
 
 void VeltraneAudioProcessor::setParameterNotifyingHost (int index, float newValue)

@@ -2,6 +2,7 @@
 
 #include "PluginParameter.h"
 #include "../dsp/Engine.h"
+#include "../dsp/SeededRandom.h"
 #include "../persistence/Preferences.h"
 #include "../persistence/PresetLibrary.h"
 
@@ -33,6 +34,8 @@ public:
     void releaseResources() override {}
     void processBlock (juce::AudioBuffer<float>& buffer, juce::MidiBuffer& midiMessages) override;
     using juce::AudioProcessor::processBlock;
+    void processBlockBypassed (juce::AudioBuffer<float>& buffer, juce::MidiBuffer& midiMessages) override;
+    using juce::AudioProcessor::processBlockBypassed;
     void reset() override {}
     bool isBusesLayoutSupported (const BusesLayout& layouts) const override;
     // How long echoes ring on after the input stops, from the current delay times and
@@ -80,8 +83,12 @@ public:
     // also arms or forgets a MIDI binding when learn or unlearn mode is on.
     void setParameterFromControl (int index, float newValue, bool fromEditor);
 
-    juce::String getLastParameterName() const;
-    juce::String getLastParameterText() const;
+    // Name and display text of the parameter set last, from any thread; empty until
+    // one is set.
+    struct LastParameter { juce::String name, text; };
+    LastParameter getLastParameter() const;
+    juce::String getLastParameterName() const { return getLastParameter().name; }
+    juce::String getLastParameterText() const { return getLastParameter().text; }
 
     PluginParameter& getParameterRecord (int index) noexcept { return parameters[(size_t) index]; }
     const PluginParameter& getParameterRecord (int index) const noexcept { return parameters[(size_t) index]; }
@@ -94,7 +101,7 @@ public:
     // Randomize off. Audio thread, at a block start.
     void randomize();
     // Fixes the Randomize generator's seed, for reproducible renders and tests.
-    void seedRandomiser (juce::int64 seed) { randomiser.setSeed (seed); }
+    void seedRandomiser (juce::int64 seed) { randomiser = SeededRandom (seed); }
 
     // Block-start requests: a pending preset load, a clear of all MIDI bindings and
     // Randomize, in that order. Audio thread.
@@ -143,6 +150,9 @@ private:
     // The preset numbered presetToLoad, at a block start; clears presetLoadPending
     // once served and keeps it set when the preset lock is busy. Audio thread.
     void loadRequestedPreset();
+    // Serves a program change or a control change from a block's MIDI; false for any
+    // other message. Audio thread.
+    bool handleProgramOrControlChange (const juce::uint8* data, int numBytes);
     void applyPresetValues (const PresetContents& preset);
     // Constructor and destructor steps of the preset library and the preferences.
     void openPersistentState();
@@ -152,7 +162,7 @@ private:
     // Two channels of delay lines, envelope followers and LFOs; each LFO's "Sample & Hold"
     // table is drawn from its own randomly seeded generator.
     Engine engine { (uint64_t) juce::Random().nextInt64() };
-    juce::Random randomiser;
+    SeededRandom randomiser { juce::Random().nextInt64() };   // seeded randomly, as Randomize's dice
     std::atomic<int> lastParameterIndex { -1 };   // -1 until a parameter is set
 
     std::unique_ptr<PreferencesFile> properties;         // per-user preferences

@@ -64,7 +64,7 @@ struct Random48
 {
     int64_t seed;
     uint32_t next() { seed = (int64_t) (((uint64_t) seed * 25214903917ull + 11) % (1ull << 48)); return (uint32_t) (seed >> 16); }
-    float nextFloat() { const float u = (float) next() / 4294967296.0f; return u == 1.0f ? 1.0f - std::numeric_limits<float>::epsilon() : u; }
+    float nextFloat() { return (float) next() / 4294967296.0f; }   // exactly 1 for the top 128 draws
     int64_t nextInt64() { const uint64_t high = next(); return (int64_t) (high << 32 | next()); }
 };
 

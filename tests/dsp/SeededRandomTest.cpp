@@ -26,9 +26,9 @@ TEST (SeededRandom, ReproducesJuceRandomNextFloat)
     }
 }
 
-TEST (SeededRandom, DrawThatRoundsToOneStaysBelowOne)
+TEST (SeededRandom, DrawThatRoundsToOneIsOne)
 {
     // This seed's first state has its top 32 bits all set, which rounds to 1.0f as a float.
     SeededRandom random (76518726186285LL);
-    EXPECT_EQ (random.nextFloat(), 0.999999881f);
+    EXPECT_EQ (random.nextFloat(), 1.0f);
 }
