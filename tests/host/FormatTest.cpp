@@ -1,0 +1,184 @@
+// The shipped VST2 binary and VST3 bundle through JUCE's hosting: identity, sound, the state
+// chunk through each format's own state mechanism, and the MIDI that reaches the plug-in.
+
+#include "HostTestSupport.h"
+
+#include <gtest/gtest.h>
+
+using namespace veltrane::test;
+
+namespace
+{
+Vst2::AEffect* effectOf (juce::AudioPluginInstance& plugin)
+{
+    struct Visitor final : juce::ExtensionsVisitor
+    {
+        void visitVSTClient (const VSTClient& client) override { effect = (Vst2::AEffect*) client.getAEffectPtr(); }
+        Vst2::AEffect* effect = nullptr;
+    } visitor;
+    plugin.getExtensions (visitor);
+    return visitor.effect;
+}
+
+// The plug-in's own chunk: VST2's bank (0) or program (1) chunk, VST3's component state in JUCE's host state.
+void setChunk (Format format, juce::AudioPluginInstance& plugin, const juce::MemoryBlock& chunk, int vst2Kind = 0)
+{
+    if (auto* effect = format == Format::vst2 ? effectOf (plugin) : nullptr)
+        effect->dispatcher (effect, Vst2::effSetChunk, vst2Kind, (juce::pointer_sized_int) chunk.getSize(), (void*) chunk.getData(), 0.0f);
+    else
+    {
+        juce::XmlElement state ("VST3PluginState");
+        state.createNewChildElement ("IComponent")->addTextElement (chunk.toBase64Encoding());
+        juce::MemoryBlock wrapped;
+        juce::AudioProcessor::copyXmlToBinary (state, wrapped);
+        plugin.setStateInformation (wrapped.getData(), (int) wrapped.getSize());
+    }
+}
+
+juce::MemoryBlock getChunk (Format format, juce::AudioPluginInstance& plugin, int vst2Kind = 0)
+{
+    juce::MemoryBlock chunk;
+    if (auto* effect = format == Format::vst2 ? effectOf (plugin) : nullptr)
+    {
+        void* data = nullptr;
+        const auto size = effect->dispatcher (effect, Vst2::effGetChunk, vst2Kind, 0, &data, 0.0f);
+        chunk.append (data, (size_t) std::max<juce::int64> (0, size));
+        return chunk;
+    }
+    juce::MemoryBlock saved;
+    plugin.getStateInformation (saved);
+    if (const auto state = juce::AudioProcessor::getXmlFromBinary (saved.getData(), (int) saved.getSize()))
+        chunk.fromBase64Encoding (state->getChildElementAllSubText ("IComponent", {}));
+    return chunk;
+}
+
+// Blocks of noise with the MIDI midiFor gives each block; the output of channel 0.
+std::vector<float> run (juce::AudioPluginInstance& plugin, int blocks, const std::function<void (juce::MidiBuffer&, int)>& midiFor)
+{
+    std::vector<float> out;
+    juce::AudioBuffer<float> buffer (2, 512);
+    juce::Random noise (11);
+    for (int b = 0; b < blocks; ++b)
+    {
+        for (int j = 0; j < 512; ++j)
+            buffer.setSample (0, j, noise.nextFloat() - 0.5f), buffer.setSample (1, j, buffer.getSample (0, j));
+        juce::MidiBuffer midi;
+        midiFor (midi, b);
+        plugin.processBlock (buffer, midi);
+        out.insert (out.end(), buffer.getReadPointer (0), buffer.getReadPointer (0) + 512);
+    }
+    return out;
+}
+
+class Formats : public ::testing::TestWithParam<Format>
+{
+protected:
+    void SetUp() override
+    {
+        plugin = loadPlugin (GetParam());
+        ASSERT_NE (plugin, nullptr);
+        plugin->prepareToPlay (44100.0, 512);
+    }
+
+    std::unique_ptr<juce::AudioPluginInstance> plugin;
+};
+}
+
+TEST_P (Formats, ReportTheIdentityAndDelayByTheDefault120Ms)
+{
+    const auto description = plugin->getPluginDescription();
+    EXPECT_EQ (plugin->getName() + "|" + description.manufacturerName + "|" + description.version.substring (0, 5), "Veltrane|Tarnwell_Audio|1.2.1");
+    EXPECT_FALSE (description.isInstrument);
+    EXPECT_EQ (plugin->getTotalNumInputChannels() * 10 + plugin->getTotalNumOutputChannels(), 22);
+    EXPECT_TRUE (plugin->acceptsMidi() && ! plugin->producesMidi());
+    if (GetParam() == Format::vst2)
+        EXPECT_EQ (description.uniqueId, 0x54615665);   // "TaVe"
+
+    const auto& parameters = plugin->getParameters();
+    ASSERT_GE (parameters.size(), 33);
+    for (auto [index, name, text] : { std::tuple (0, "Delay1Time", "120.00 Ms"), { 6, "Delay1Gain", "0.00 dB" }, { 28, "LFO1SyncedRate", "1/4" },
+                                      { 32, "LFO2SyncedRate", "1/4" } })
+        EXPECT_EQ (parameters[index]->getName (64) + " " + parameters[index]->getCurrentValueAsText(), juce::String (name) + " " + text);
+
+    juce::AudioBuffer<float> audio (2, 512);
+    int first = -1;
+    for (int block = 0; block < 12 && first < 0; ++block)
+    {
+        audio.clear();
+        audio.setSample (0, 0, block == 0 ? 1.0f : 0.0f);
+        juce::MidiBuffer midi;
+        plugin->processBlock (audio, midi);
+        for (int j = 0; j < 512 && first < 0; ++j)
+            first = std::abs (audio.getSample (0, j)) > 1.0e-6f ? block * 512 + j : -1;
+    }
+    EXPECT_EQ (first, 5292);
+}
+
+TEST_P (Formats, ChunkRestoresEveryValueAndSavesTheSameBytes)
+{
+    // Every parameter at (7 i + 3) % 64 / 64 but Randomize, a controller for two in three, a name needing escapes.
+    const auto chunk = edited (getChunk (GetParam(), *plugin), [] (juce::XmlElement& state) {
+        state.setAttribute ("PresetName", "Formats & \"Friends\"");
+        for (int i = 0; i < 33; ++i)
+        {
+            const auto id = state.getAttributeName (1 + 2 * i);
+            state.setAttribute (id, juce::String::formatted ("%.9g", id == "Randomize" ? 0.0 : (double) ((i * 7 + 3) % 64) / 64.0));
+            state.setAttribute (id + "CC", i % 3 == 0 ? -1 : i + 10);
+        }
+    });
+
+    for (auto vst2Kind : { 0, 1 })   // bank, program
+    {
+        setChunk (GetParam(), *plugin, chunk, vst2Kind);
+        for (int i = 0; i < 33; ++i)
+            EXPECT_FLOAT_EQ (plugin->getParameters()[i]->getValue(), i == 18 ? 0.0f : (float) ((i * 7 + 3) % 64) / 64.0f) << i;
+        const auto saved = getChunk (GetParam(), *plugin, vst2Kind);
+        ASSERT_GE (saved.getSize(), chunk.getSize());   // JUCE's VST3 wrapper may append data of its own
+        EXPECT_EQ (juce::MemoryBlock (saved.getData(), chunk.getSize()), chunk);
+    }
+}
+
+TEST_P (Formats, LearnedControllersProgramChangesAndNotesReachThePlugIn)
+{
+    const auto folder = juce::File::getSpecialLocation (juce::File::userHomeDirectory).getChildFile (".Tarnwell_Audio/Presets/Veltrane");
+    ASSERT_TRUE (folder.createDirectory());
+    ASSERT_TRUE (folder.getChildFile ("Quiet.vtp").replaceWithText ("<VELTRANE_PRESET PresetName=\"Quiet\" WaveshaperAmount=\"0.25\"/>"));
+
+    // DryWet follows CC 74; LFO 1, a slow rising saw, swings Delay 1's time fully in "Solo 1".
+    plugin = loadPlugin (GetParam());   // lists the preset
+    auto restarted = loadPlugin (GetParam());
+    for (auto* p : { plugin.get(), restarted.get() })
+    {
+        ASSERT_NE (p, nullptr);
+        p->prepareToPlay (44100.0, 512);
+        setChunk (GetParam(), *p, edited (getChunk (GetParam(), *p), [] (juce::XmlElement& state) {
+            for (auto [id, value] : { std::pair ("DryWetCC", 74.0), { "Delay1TimeMod", 1.0 }, { "Delay1TimeModSource", 5.0 / 6.0 },
+                                      { "LFO1Wave", 0.4 }, { "LFO1Rate", 0.1 }, { "MixMode", 0.5 } })
+                state.setAttribute (id, value);
+        }));
+    }
+
+    auto midiWith = [] (bool note) {
+        return [note] (juce::MidiBuffer& midi, int block) {
+            if (block == 0)
+                midi.addEvent (juce::MidiMessage::controllerEvent (5, 74, 32), 100), midi.addEvent (juce::MidiMessage::programChange (1, 0), 10);
+            if (block == 30 && note)
+                midi.addEvent (juce::MidiMessage::noteOn (1, 60, (juce::uint8) 100), 100);
+        };
+    };
+    const auto plain = run (*plugin, 60, midiWith (false)), withNote = run (*restarted, 60, midiWith (true));
+
+    const auto state = parseStateChunk (getChunk (GetParam(), *plugin));
+    EXPECT_FLOAT_EQ ((float) state->getDoubleAttribute ("DryWet"), 32.0f / 127.0f);
+    EXPECT_EQ (state->getStringAttribute ("PresetName") + " " + state->getStringAttribute ("WaveshaperAmount"), "Quiet 0.25");
+
+    // The note restarts LFO 1: the same input sounds the same up to it and differently after it.
+    EXPECT_TRUE (std::equal (plain.begin(), plain.begin() + 30 * 512 + 100, withNote.begin()));
+    float difference = 0.0f;
+    for (size_t j = 30 * 512 + 100; j < plain.size(); ++j)
+        difference = std::max (difference, std::abs (plain[j] - withNote[j]));
+    EXPECT_GT (difference, 0.01f);
+}
+
+INSTANTIATE_TEST_SUITE_P (Vst2AndVst3, Formats, ::testing::Values (Format::vst2, Format::vst3),
+                          [] (const auto& info) { return info.param == Format::vst2 ? "Vst2" : "Vst3"; });
