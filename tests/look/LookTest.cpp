@@ -1,4 +1,3 @@
-#include "editor/DelayComponent.h"
 #include "look/TarnwellLogo.h"
 #include "look/VeltraneBackground.h"
 #include "look/VeltraneLook.h"
@@ -92,31 +91,6 @@ TEST (VeltraneLook, FaderBarsGrowFromOppositeEdgesAndComboArrowsShowWhenEnabled)
     }
 }
 
-TEST (VeltraneLook, PopupMenusAreStripedAndHighlightWithDarkTextOnOrange)
-{
-    VeltraneLook look;
-    const auto background = drawn (60, 30, [&] (juce::Graphics& g) { look.drawPopupMenuBackground (g, 60, 30); });
-    EXPECT_EQ (background.getPixelAt (30, 3), juce::Colour (0xFF394143));
-    EXPECT_EQ (background.getPixelAt (30, 4), grey);
-    EXPECT_NEAR (background.getPixelAt (0, 20).getRed(), grey.overlaidWith (orange.withAlpha (0.6f)).getRed(), 2);
-
-    auto item = [&] (bool active, bool highlighted) {
-        return drawn (120, 24, [&] (juce::Graphics& g) { look.drawPopupMenuItem (g, { 120, 24 }, false, active, highlighted, false, false, "Wide", {}, nullptr, nullptr); });
-    };
-    auto anyPixel = [] (const juce::Image& image, auto predicate) {
-        for (int y = 0; y < image.getHeight(); ++y)
-            for (int x = 0; x < image.getWidth(); ++x)
-                if (predicate (image.getPixelAt (x, y)))
-                    return true;
-        return false;
-    };
-    const auto highlighted = item (true, true), inactive = item (false, false);
-    EXPECT_EQ (highlighted.getPixelAt (110, 12), orange);
-    EXPECT_TRUE (anyPixel (highlighted, [] (juce::Colour c) { return c == grey; }));
-    EXPECT_TRUE (anyPixel (inactive, [] (juce::Colour c) { return c.getAlpha() > 0; }));
-    EXPECT_FALSE (anyPixel (inactive, [] (juce::Colour c) { return c.getAlpha() > 77; }));   // opacity 0.3
-}
-
 TEST (Background, FramesGlowWordmarkAndLogoAt800By400)
 {
     VeltraneBackground background;
@@ -152,16 +126,4 @@ TEST (Logo, SolidOrangeBarsFromATenthToNineTenthsOfItsHeight)
                 ASSERT_TRUE (y >= 6 && y < 57 && (c == orange || c.getAlpha() < 255)) << x << ", " << y;
     for (auto y : { 6, 32, 56 })
         EXPECT_EQ (image.getPixelAt (6, y), orange) << y;   // the wide bar
-}
-
-TEST (DelayPanel, PaintsItsNumeralInBars)
-{
-    Delay1Component one;
-    Delay2Component two;
-    for (auto* panel : { (juce::Component*) &one, (juce::Component*) &two })
-    {
-        const auto image = drawn (500, 250, [&] (juce::Graphics& g) { panel->paint (g); });
-        for (auto [x, y, lit] : { std::tuple (447, 40, true), { 437, 40, panel == &two }, { 452, 20, true }, { 447, 10, false } })
-            EXPECT_EQ (image.getPixelAt (x, y) == orange, lit) << x << ", " << y;
-    }
 }

@@ -117,16 +117,3 @@ TEST (Preferences, BindingsAndEditorSizeOutliveTheInstanceUnderCaseSensitiveKeys
     EXPECT_EQ (odd.lastEditorHeight, 0.0f);
     EXPECT_EQ (controllerOf (odd, Param::Delay1Time), -1);
 }
-
-TEST (Preferences, AnUnwritableFileLosesNothingElse)
-{
-    const tools::PrivateHome home;
-    ASSERT_TRUE (preferencesFile().createDirectory());   // a folder where the file should be
-    {
-        VeltraneAudioProcessor processor;
-        processor.getParameterRecord (0).midiController = 3;
-    }
-    EXPECT_TRUE (preferencesFile().isDirectory());
-    VeltraneAudioProcessor next;
-    EXPECT_EQ (controllerOf (next, 0), -1);
-}
