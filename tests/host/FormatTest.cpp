@@ -3,18 +3,38 @@
 
 #include "HostTestSupport.h"
 
+#include <pluginterfaces/vst2.x/aeffectx.h>
+
 #include <gtest/gtest.h>
 
 using namespace veltrane::test;
 
 namespace
 {
-Vst2::AEffect* effectOf (juce::AudioPluginInstance& plugin)
+// The plug-in's state chunk: "VC2!", the length, one line of XML, a zero byte; edited as XML.
+std::unique_ptr<juce::XmlElement> parseStateChunk (const juce::MemoryBlock& chunk)
+{
+    return juce::parseXML (juce::String::fromUTF8 ((const char*) chunk.getData() + 8, juce::jmax (0, (int) chunk.getSize() - 9)));
+}
+
+juce::MemoryBlock edited (const juce::MemoryBlock& chunk, const std::function<void (juce::XmlElement&)>& edit)
+{
+    auto state = parseStateChunk (chunk);
+    edit (*state);
+    const auto text = state->toString (juce::XmlElement::TextFormat().singleLine().withoutHeader());
+    juce::MemoryOutputStream out;
+    out.write ("VC2!", 4);
+    out.writeInt ((int) text.getNumBytesAsUTF8());
+    out.write (text.toRawUTF8(), text.getNumBytesAsUTF8() + 1);
+    return out.getMemoryBlock();
+}
+
+AEffect* effectOf (juce::AudioPluginInstance& plugin)
 {
     struct Visitor final : juce::ExtensionsVisitor
     {
-        void visitVSTClient (const VSTClient& client) override { effect = (Vst2::AEffect*) client.getAEffectPtr(); }
-        Vst2::AEffect* effect = nullptr;
+        void visitVSTClient (const VSTClient& client) override { effect = (AEffect*) client.getAEffectPtr(); }
+        AEffect* effect = nullptr;
     } visitor;
     plugin.getExtensions (visitor);
     return visitor.effect;
@@ -24,7 +44,7 @@ Vst2::AEffect* effectOf (juce::AudioPluginInstance& plugin)
 void setChunk (Format format, juce::AudioPluginInstance& plugin, const juce::MemoryBlock& chunk, int vst2Kind = 0)
 {
     if (auto* effect = format == Format::vst2 ? effectOf (plugin) : nullptr)
-        effect->dispatcher (effect, Vst2::effSetChunk, vst2Kind, (juce::pointer_sized_int) chunk.getSize(), (void*) chunk.getData(), 0.0f);
+        effect->dispatcher (effect, effSetChunk, vst2Kind, (juce::pointer_sized_int) chunk.getSize(), (void*) chunk.getData(), 0.0f);
     else
     {
         juce::XmlElement state ("VST3PluginState");
@@ -41,7 +61,7 @@ juce::MemoryBlock getChunk (Format format, juce::AudioPluginInstance& plugin, in
     if (auto* effect = format == Format::vst2 ? effectOf (plugin) : nullptr)
     {
         void* data = nullptr;
-        const auto size = effect->dispatcher (effect, Vst2::effGetChunk, vst2Kind, 0, &data, 0.0f);
+        const auto size = effect->dispatcher (effect, effGetChunk, vst2Kind, 0, &data, 0.0f);
         chunk.append (data, (size_t) std::max<juce::int64> (0, size));
         return chunk;
     }
@@ -73,14 +93,8 @@ std::vector<float> run (juce::AudioPluginInstance& plugin, int blocks, const std
 class Formats : public ::testing::TestWithParam<Format>
 {
 protected:
-    void SetUp() override
-    {
-        plugin = loadPlugin (GetParam());
-        ASSERT_NE (plugin, nullptr);
-        plugin->prepareToPlay (44100.0, 512);
-    }
-
-    std::unique_ptr<juce::AudioPluginInstance> plugin;
+    void SetUp() override { ASSERT_NE (plugin, nullptr); }
+    std::unique_ptr<juce::AudioPluginInstance> plugin = loadPlugin (GetParam());
 };
 }
 
@@ -150,7 +164,6 @@ TEST_P (Formats, LearnedControllersProgramChangesAndNotesReachThePlugIn)
     for (auto* p : { plugin.get(), restarted.get() })
     {
         ASSERT_NE (p, nullptr);
-        p->prepareToPlay (44100.0, 512);
         setChunk (GetParam(), *p, edited (getChunk (GetParam(), *p), [] (juce::XmlElement& state) {
             for (auto [id, value] : { std::pair ("DryWetCC", 74.0), { "Delay1TimeMod", 1.0 }, { "Delay1TimeModSource", 5.0 / 6.0 },
                                       { "LFO1Wave", 0.4 }, { "LFO1Rate", 0.1 }, { "MixMode", 0.5 } })

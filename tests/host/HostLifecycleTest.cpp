@@ -8,7 +8,7 @@
 
 namespace
 {
-using veltrane::test::Format;
+using namespace veltrane::test;
 
 // The peak of numBlocks blocks of noise at half scale (infinity for a non-finite sample).
 float peakOf (juce::AudioPluginInstance& plugin, int channels, int blockSize, int numBlocks,
@@ -39,9 +39,8 @@ TEST (HostLifecycle, ManyInstancesInARowAndSideBySide)
     std::vector<std::unique_ptr<juce::AudioPluginInstance>> instances;
     for (int i = 0; i < 24; ++i)
     {
-        instances.push_back (veltrane::test::loadPlugin (Format::vst2));
+        instances.push_back (loadPlugin (Format::vst2));
         ASSERT_NE (instances.back(), nullptr);
-        instances.back()->prepareToPlay (48000.0, 128);
         EXPECT_LT (peakOf (*instances.back(), 2, 128, 4), 10.0f);
         if (i % 3 != 2)
             instances.back().reset();   // most closed at once, the others at the end in another order
@@ -52,7 +51,7 @@ TEST (HostLifecycle, ManyInstancesInARowAndSideBySide)
 
 TEST (HostLifecycle, AbsurdRatesBlockSizesTransportsMidiAndInput)
 {
-    auto plugin = veltrane::test::loadPlugin (Format::vst2);
+    auto plugin = loadPlugin (Format::vst2);
     ASSERT_NE (plugin, nullptr);
     auto& parameters = plugin->getParameters();
     for (auto [index, value] : { std::pair (27, 1.0f), { 31, 1.0f }, { 2, 1.0f }, { 9, 1.0f }, { 3, 0.84f }, { 10, 1.0f }, { 1, 1.0f } })

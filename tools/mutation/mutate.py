@@ -132,6 +132,7 @@ def main():
     parser.add_argument("--timeout", type=int, default=300, help="seconds per test before it counts as hung")
     parser.add_argument("--jobs", type=int, default=2)
     parser.add_argument("--all-tests", action="store_true", help="run the whole suite even after a failure")
+    parser.add_argument("--exclude", help="leave out the tests matching this regular expression (ctest -E)")
     parser.add_argument("--list", action="store_true", help="list the mutants and stop")
     parser.add_argument("--check", action="store_true", help="check that every snippet applies to the working tree and stop")
     args = parser.parse_args()
@@ -172,6 +173,8 @@ def main():
     ctest = ["ctest", "-j", jobs, "--timeout", str(args.timeout), "--output-on-failure"]
     if not args.all_tests:
         ctest.append("--stop-on-failure")
+    if args.exclude:
+        ctest += ["-E", args.exclude]
 
     print(f"scratch copy in {source}; configuring and building once", flush=True)
     if run(["cmake", "-S", ".", "-B", "build", "-DCMAKE_BUILD_TYPE=Release",
@@ -199,8 +202,8 @@ def main():
             path.write_text(text.replace(m.original, m.replacement))
             try:
                 log = logs / f"{m.id}.log"
-                if run(build_command, source, log, env) != 0:
-                    outcome, detail = "invalid", f"does not compile, see {log}"
+                if run(build_command, source, logs / f"{m.id}.build.log", env) != 0:
+                    outcome, detail = "invalid", f"does not compile, see {logs / (m.id + '.build.log')}"
                 else:
                     try:
                         code = run(ctest, build, log, env, timeout=args.timeout * 20)
