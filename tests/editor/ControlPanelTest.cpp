@@ -20,7 +20,6 @@ const struct Knob { const char* panel; const char* slider; int parameter; int st
     { "Global Panel", "Dry Wet Slider", Param::DryWet, 0 },               { "Global Panel", "Waveshaper Slider", Param::Waveshaper, 3 },
     { "Global Panel", "Boost Slider", Param::WaveshaperAmount, 0 },
 };
-
 // What the processor tells its listeners, as a host's wrapper hears it.
 struct HostLog final : juce::AudioProcessorListener
 {
@@ -33,7 +32,6 @@ struct HostLog final : juce::AudioProcessorListener
     juce::AudioProcessor& processor;
     juce::StringArray calls;
 };
-
 juce::String gesture (int index, double value) { return "begin " + juce::String (index) + "|set " + juce::String (index) + " " + juce::String (value, 4) + "|end " + juce::String (index); }
 }
 
@@ -46,25 +44,21 @@ TEST (ControlPanels, KnobsShowTheParameterAndSendOneGesturePerChangeAndDoubleCli
         const auto n = juce::jmax (1, knob.steps);
         const auto home = open.processor.getParameterRecord (knob.parameter).defaultValue;
         EXPECT_NEAR (slider.getValue(), home * n, 0.0005) << knob.slider;
-
         HostLog host (open.processor);
         slider.setValue (knob.steps > 0 ? 2.0 : 0.25, juce::sendNotificationSync);
         EXPECT_EQ (host.calls.joinIntoString ("|"), gesture (knob.parameter, knob.steps > 0 ? 2.0 / n : 0.25)) << knob.slider;
         EXPECT_EQ (open.processor.getLastParameterName(), open.processor.getParameterName (knob.parameter));
-
         // A host change shows at the next poll, rounded to the knob's step, and goes back nowhere.
         host.calls.clear();
         open.processor.setParameter (knob.parameter, 0.59f);
         tick (*open.editor);
         EXPECT_NEAR (slider.getValue(), knob.steps > 0 ? std::round (0.59 * n) : 0.59, 1e-9) << knob.slider;
         EXPECT_TRUE (host.calls.isEmpty()) << knob.slider;
-
         const auto centre = slider.getLocalBounds().getCentre().toFloat();
         slider.mouseDoubleClick (mouseAt (slider, centre, centre, 2));
         EXPECT_NEAR (open.processor.getParameter (knob.parameter), home, 0.0005) << knob.slider;
         EXPECT_EQ (host.calls.size(), 3) << knob.slider;
     }
-
     open.processor.setParameter (Param::Delay1TimeModSource, 0.59f);   // step 3.54: the label truncates as the engine does
     open.processor.setParameter (Param::LFO1Wave, 1.0f);
     tick (*open.editor);
@@ -81,7 +75,6 @@ TEST (ControlPanels, SyncSwitchShowsOneRateKnobAndFollowsTheHostAsTheEngineReads
         for (auto [name, showsWhenOn] : { std::pair ("Rate Slider", false), { "Rate Label", false }, { "Synced Rate Slider", true }, { "Synced Rate Label", true } })
             EXPECT_EQ (open.in ("Lfo1 Component", name).isVisible(), on == showsWhenOn) << name << " with sync " << on;
     };
-
     expectSynced (false);
     HostLog host (open.processor);
     click (button);
@@ -89,7 +82,6 @@ TEST (ControlPanels, SyncSwitchShowsOneRateKnobAndFollowsTheHostAsTheEngineReads
     EXPECT_EQ (host.calls.joinIntoString ("|"), gesture (Param::LFO1Sync, 1.0));
     tick (*open.editor);
     EXPECT_EQ (open.in<juce::Label> ("Lfo1 Component", "Synced Rate Label").getText(), "1/4");
-
     for (auto [value, on] : { std::pair (0.7f, false), { 1.0f, true } })
     {
         open.processor.setParameter (Param::LFO1Sync, value);
@@ -122,17 +114,14 @@ TEST (ControlPanels, RandomStaysOnUntilTheBlockHasRandomizedAndTheDisplayNamesTh
     auto& name = open.in<juce::Label> ("Global Panel", "Last Parameter Name");
     auto& value = open.in<juce::Label> ("Global Panel", "Last Parameter Value");
     EXPECT_EQ (name.getText() + value.getText(), "");
-
     click (random);
     tick (*open.editor);   // no audio block yet
     EXPECT_TRUE (random.getToggleState());
     EXPECT_EQ (name.getText() + " " + value.getText(), "Randomize On");
-
     open.processor.serveBlockStartRequests();
     tick (*open.editor);
     EXPECT_FALSE (random.getToggleState());
     EXPECT_NEAR (open.in<juce::Slider> ("Delay 1", "Time Slider").getValue(), open.processor.getParameter (Param::Delay1Time), 0.0005);
-
     open.in<juce::Slider> ("Envelope2 Component", "Attack Slider").setValue (0.5, juce::sendNotificationSync);
     tick (*open.editor);
     EXPECT_EQ (name.getText() + " " + value.getText(), "Envelope2Attack 3.00 Ms");
@@ -145,7 +134,6 @@ TEST (PresetPanel, PickingItemKLoadsIndexKMinusOneAndATypedNameLoadsNothing)
     EXPECT_EQ (box.getText(), "Init");
     for (const auto* name : { "Ambient", "Slapback", "Wide" })
         box.addItem (name, box.getNumItems() + 1);   // as a list refresh fills it
-
     for (int id : { 1, 3 })
     {
         box.setSelectedId (id, juce::sendNotificationSync);
@@ -155,7 +143,6 @@ TEST (PresetPanel, PickingItemKLoadsIndexKMinusOneAndATypedNameLoadsNothing)
     box.setText ("slapback", juce::sendNotificationSync);
     EXPECT_EQ (open.processor.presetToLoad.load(), -1);
     EXPECT_EQ (open.processor.getPresetName(), "slapback");
-
     auto& save = open.in<juce::TextButton> ("Preset Component", "Save Button");
     click (save);
     EXPECT_TRUE (open.processor.presetListChanged.load());
@@ -174,7 +161,6 @@ TEST (MidiPanel, SwitchesSetTheModesAndClearStaysLitUntilTheBlockHasCleared)
     EXPECT_TRUE (open.processor.midiLearnActive.load());
     open.in<juce::Slider> ("Delay 2", "Feedback Slider").setValue (0.7, juce::sendNotificationSync);
     EXPECT_TRUE (open.processor.getParameterRecord (Param::Delay2Feedback).learnArmed.load());
-
     auto& clear = find<juce::TextButton> (*open.editor, "Clear Button");
     open.processor.getParameterRecord (Param::MixMode).midiController = 20;
     click (clear);

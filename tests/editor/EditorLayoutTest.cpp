@@ -15,7 +15,6 @@ void dragCorner (juce::Component& editor, int dx, int dy)
     corner.mouseDrag (mouseAt (corner, end, start));
     corner.mouseUp (mouseAt (corner, end, start));
 }
-
 float fontOf (juce::Component& root, const char* label) { return find<juce::Label> (root, label).getFont().getHeight(); }
 }
 
@@ -30,7 +29,6 @@ TEST (EditorLayout, ChildrenStackAndSitByTheTableAtDefaultAndSmallestSize)
         { "Global Panel", { 400, 50, 200, 450 }, { 320, 40, 160, 360 } },    { "", { 0, 460, 400, 30 }, { 0, 368, 320, 24 } },
         { "Preset Component", { 600, 250, 400, 100 }, { 480, 200, 320, 80 } },
     };
-
     for (const auto smallest : { false, true })
     {
         OpenEditor open (smallest ? 800.0f : 1000.0f, smallest ? 400.0f : 500.0f);
@@ -76,7 +74,6 @@ TEST (EditorLayout, CornerKeepsRatioAndLimitsAndTheNextEditorOpensAtTheLastSize)
         dragCorner (*open.editor, d.dx, d.dy);
         EXPECT_EQ (open.editor->getBounds(), juce::Rectangle<int> (d.width, d.height)) << d.dx << ", " << d.dy;
     }
-
     open.editor.reset();
     VeltraneAudioProcessorEditor reopened (open.processor);
     EXPECT_EQ (reopened.getBounds(), juce::Rectangle<int> (1400, 700));
@@ -87,7 +84,6 @@ TEST (EditorLayout, StoredSizeIsTakenAsItIsUnlessNoWindowCouldHaveIt)
     const struct { float width, height; int openWidth, openHeight; } cases[] {
         { 1234.9f, 617.7f, 1234, 617 }, { 3000.0f, 300.0f, 3000, 300 }, { 0.0f, 0.0f, 1000, 500 }, { -20.0f, 400.0f, 1000, 500 },
         { std::numeric_limits<float>::quiet_NaN(), 500.0f, 1000, 500 }, { 1.0e12f, 5.0e11f, 1000, 500 } };
-
     for (const auto& c : cases)
     {
         OpenEditor open (c.width, c.height);

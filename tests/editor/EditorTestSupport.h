@@ -9,22 +9,17 @@ namespace veltrane::test
 
 // The first component of type T below root (depth first), with the given name unless empty.
 template <typename T = juce::Component>
-T* findChild (juce::Component& root, const juce::String& name = {})
-{
-    for (auto* child : root.getChildren())
-    {
-        if (auto* match = dynamic_cast<T*> (child); match != nullptr && (name.isEmpty() || child->getName() == name))
-            return match;
-        if (auto* deeper = findChild<T> (*child, name))
-            return deeper;
-    }
-    return nullptr;
-}
-
-template <typename T = juce::Component>
 T& find (juce::Component& root, const juce::String& name = {})
 {
-    if (auto* found = findChild<T> (root, name))
+    std::function<T* (juce::Component&)> search = [&] (juce::Component& parent) -> T* {
+        for (auto* child : parent.getChildren())
+            if (auto* match = dynamic_cast<T*> (child); match != nullptr && (name.isEmpty() || child->getName() == name))
+                return match;
+            else if (auto* deeper = search (*child))
+                return deeper;
+        return nullptr;
+    };
+    if (auto* found = search (root))
         return *found;
     throw std::runtime_error (("no component " + name).toStdString());
 }
@@ -41,8 +36,7 @@ inline void tick (juce::Component& root)
 inline juce::MouseEvent mouseAt (juce::Component& c, juce::Point<float> pos, juce::Point<float> down, int clicks = 1)
 {
     const auto now = juce::Time::getCurrentTime();
-    return { juce::Desktop::getInstance().getMainMouseSource(), pos, {}, juce::MouseInputSource::defaultPressure, 0, 0, 0, 0,
-             &c, &c, now, down, now, clicks, pos != down };
+    return { juce::Desktop::getInstance().getMainMouseSource(), pos, {}, juce::MouseInputSource::defaultPressure, 0, 0, 0, 0, &c, &c, now, down, now, clicks, pos != down };
 }
 
 // A click as the mouse makes it: the listeners have heard it when this returns.
@@ -53,7 +47,7 @@ inline void click (juce::Component& button)
     button.mouseUp (mouseAt (button, centre, centre));
 }
 
-// A processor in a private home and its open editor, polled once.
+// A processor in a home of its own and its open editor, polled once.
 struct OpenEditor
 {
     explicit OpenEditor (float width = 1000.0f, float height = 500.0f)
@@ -62,7 +56,6 @@ struct OpenEditor
         editor = std::make_unique<VeltraneAudioProcessorEditor> (processor);
         tick (*editor);
     }
-
     template <typename T = juce::Component>
     T& in (const juce::String& panel, const juce::String& name) { return find<T> (find (*editor, panel), name); }
 

@@ -24,7 +24,6 @@ protected:
         ASSERT_NE (effect, nullptr);
         dispatch (effOpen);
     }
-
     void TearDown() override
     {
         if (effect != nullptr)
@@ -32,16 +31,13 @@ protected:
         if (library != nullptr)
             dlclose (library);
     }
-
     VstIntPtr dispatch (VstInt32 opcode, VstInt32 index = 0, VstIntPtr value = 0, void* ptr = nullptr) { return effect->dispatcher (effect, opcode, index, value, ptr, 0.0f); }
-
     std::string text (VstInt32 opcode, VstInt32 index = 0)
     {
         char buffer[256] = {};
         dispatch (opcode, index, 0, buffer);
         return buffer;
     }
-
     void* library = nullptr;
     AEffect* effect = nullptr;
 };
@@ -59,16 +55,13 @@ TEST_F (RawVst2, EffectRecordAndQueriesGiveTheDocumentedIdentity)
                effFlagsHasEditor | effFlagsCanReplacing | effFlagsProgramChunks);
     EXPECT_LE (effect->numPrograms, 1);   // JUCE's wrapper reports one program at most, without a name
     EXPECT_EQ (text (effGetProgramName), "");
-
     EXPECT_EQ (text (effGetEffectName) + "|" + text (effGetProductString) + "|" + text (effGetVendorString), "Veltrane|Veltrane|Tarnwell_Audio");
     EXPECT_EQ (dispatch (effGetPlugCategory), kPlugCategEffect);
     EXPECT_EQ (dispatch (effGetVstVersion), 2400);
-
     for (auto [query, answer] : { std::pair ("receiveVstEvents", 1), { "receiveVstMidiEvent", 1 }, { "receiveVstMidiEvents", 1 },
                                   { "receiveVstTimeInfo", 1 }, { "conformsToWindowRules", 1 }, { "bypass", 1 }, { "sendVstEvents", -1 },
                                   { "sendVstMidiEvent", -1 }, { "sendVstMidiEvents", -1 }, { "openCloseAnyThread", -1 }, { "offline", 0 }, { "", 0 } })
         EXPECT_EQ (dispatch (effCanDo, 0, 0, const_cast<char*> (query)), answer) << query;
-
     for (auto [inputs, outputs, accepted] : { std::tuple (1, 1, 1), { 2, 2, 1 }, { 2, 1, 0 } })
     {
         VstSpeakerArrangement in {}, out {};

@@ -9,10 +9,8 @@ using namespace veltrane;
 namespace
 {
 const juce::Colour orange (0xFFF76029), grey (0xFF222222), clear (0x00000000);
-
 // Orange laid at least half over the grey: a one-pixel line between pixel rows.
 bool tinted (juce::Colour c) { return c.getRed() > grey.getRed() + 0x50; }
-
 // What fn draws into an empty image of the given size.
 template <typename Fn>
 juce::Image drawn (int w, int h, Fn&& fn)
@@ -22,7 +20,6 @@ juce::Image drawn (int w, int h, Fn&& fn)
     fn (g);
     return image;
 }
-
 juce::Colour ringPixel (const juce::Image& image, float radius, float angle)   // clockwise from twelve o'clock
 {
     return image.getPixelAt (juce::roundToInt (52.0f + radius * std::sin (angle) - 0.5f), juce::roundToInt (52.0f - radius * std::cos (angle) - 0.5f));
@@ -50,7 +47,6 @@ TEST (VeltraneLook, KnobRingsShowTheValueAndTheRestAndGreyWhenDisabled)
     slider.setColour (juce::Slider::rotarySliderFillColourId, orange);
     const auto start = juce::MathConstants<float>::pi * 1.2f, end = juce::MathConstants<float>::pi * 2.8f, middle = (start + end) / 2;
     auto knob = [&] (float proportion) { return drawn (104, 104, [&] (juce::Graphics& g) { look.drawRotarySlider (g, 0, 0, 104, 104, proportion, start, end, slider); }); };
-
     // Rings at radius 50 (value), 40 (rest), 20 (value), each a tenth of its radius thick.
     for (auto [proportion, outerAndInner, middleRing] : { std::tuple (0.0f, false, true), { 1.0f, true, false } })
     {
@@ -59,7 +55,6 @@ TEST (VeltraneLook, KnobRingsShowTheValueAndTheRestAndGreyWhenDisabled)
             EXPECT_EQ (ringPixel (image, radius, middle).getAlpha() > 100, lit) << proportion << " at " << radius;
         EXPECT_EQ (ringPixel (image, 48.5f, juce::MathConstants<float>::pi), clear);   // the gap at the bottom
     }
-
     slider.setEnabled (false);
     const auto grey80 = ringPixel (knob (1.0f), 48.5f, middle);
     EXPECT_EQ (grey80.getAlpha(), 0x80);
@@ -75,7 +70,6 @@ TEST (VeltraneLook, FaderBarsGrowFromOppositeEdgesAndComboArrowsShowWhenEnabled)
     const auto quarter = drawn (50, 100, [&] (juce::Graphics& g) { look.drawLinearSliderThumb (g, 0, 0, 50, 100, 75.0f, 0, 0, juce::Slider::LinearVertical, fader); });
     for (auto [x, y, lit] : { std::tuple (2, 90, true), { 47, 90, true }, { 2, 60, false }, { 22, 10, true }, { 22, 90, false }, { 12, 90, false } })
         EXPECT_EQ (quarter.getPixelAt (x, y) == orange, lit) << x << ", " << y;
-
     juce::ComboBox box;
     box.setColour (juce::ComboBox::backgroundColourId, grey);
     box.setColour (juce::ComboBox::outlineColourId, orange);
@@ -95,23 +89,19 @@ TEST (Background, FramesGlowWordmarkAndLogoAt800By400)
 {
     VeltraneBackground background;
     const auto image = background.createComponentSnapshot ({ 800, 400 }, true, 1.0f);
-
     // Straight edges of the frames: Delay 1 at y 40 and 44, the small frames at 276, 280, 284,
     // Global at x 320 and 479 down to the bottom edge, Delay 2 on the right edge.
     for (auto [x, y, lit] : { std::tuple (100, 40, true), { 100, 44, true }, { 100, 42, false }, { 100, 48, false }, { 100, 276, true },
                               { 100, 280, true }, { 100, 284, true }, { 320, 300, true }, { 479, 200, true }, { 400, 399, true }, { 799, 100, true } })
         EXPECT_EQ (tinted (image.getPixelAt (x, y)), lit) << x << ", " << y;
-
     EXPECT_EQ (image.getPixelAt (400, 10), grey);   // the glow starts at 0.05 H, translucent
     EXPECT_TRUE (image.getPixelAt (600, 38).getRed() > grey.getRed() + 40 && image.getPixelAt (600, 38).getRed() < orange.getRed());
-
     int wordmark = 0;   // orange only inside its band 0.02..0.30 W, 0.54..0.65 H
     for (int y = 200; y < 276; ++y)
         for (int x = 4; x < 316; ++x)
             if (image.getPixelAt (x, y) == orange)
                 wordmark += juce::Rectangle<int> (16, 216, 224, 44).contains (x, y) ? 1 : 10000;
     EXPECT_TRUE (wordmark > 600 && wordmark < 10000) << wordmark;
-
     EXPECT_EQ (background.getChildComponent (0)->getBounds(), juce::Rectangle<int> (736, 208, 64, 64));
 }
 

@@ -18,9 +18,7 @@ void controlChange (VeltraneAudioProcessor& processor, int channel, int controll
     midi.addEvent (juce::MidiMessage::controllerEvent (channel, controller, value), 10);
     processor.processBlock (buffer, midi);
 }
-
 int controllerOf (VeltraneAudioProcessor& processor, int index) { return processor.getParameterRecord (index).midiController.load(); }
-
 juce::File preferencesFile() { return juce::File::getSpecialLocation (juce::File::userHomeDirectory).getChildFile (".Tarnwell_Audio/Veltrane.prefs"); }
 }
 
@@ -33,7 +31,6 @@ TEST (MidiLearn, TouchedControlsLearnTheNextControllerOnAnyChannelAndFollowIt)
     processor.setParameterFromControl (Param::Delay1Time, 0.3f, true);
     processor.setParameterFromControl (Param::DryWet, 0.5f, true);
     processor.setParameterFromControl (Param::MixMode, 0.5f, false);      // a controller never arms
-
     controlChange (processor, 5, 74, 127);
     for (auto index : { Param::Delay1Time, Param::DryWet })
     {
@@ -42,12 +39,10 @@ TEST (MidiLearn, TouchedControlsLearnTheNextControllerOnAnyChannelAndFollowIt)
     }
     for (auto index : { Param::Waveshaper, Param::MixMode })
         EXPECT_EQ (controllerOf (processor, index), -1);
-
     controlChange (processor, 16, 74, 64);
     EXPECT_EQ (processor.getParameter (Param::Delay1Time), 64.0f / 127.0f);
     controlChange (processor, 1, 75, 0);   // no parameter follows 75
     EXPECT_EQ (processor.getParameter (Param::DryWet), 64.0f / 127.0f);
-
     // Armed while learn mode is off, a parameter waits for learn mode to come back.
     processor.setParameterFromControl (Param::LFO1Rate, 0.1f, true);
     processor.midiLearnActive = false;
@@ -65,14 +60,12 @@ TEST (MidiLearn, UnlearnForgetsTouchedBindingsAndClearWaitsForTheNextBlock)
     processor.getParameterRecord (Param::LFO1Rate).midiController = 30;
     processor.getParameterRecord (Param::LFO2Rate).midiController = 31;
     processor.midiUnlearnActive = true;
-
     processor.setParameterFromControl (Param::LFO1Rate, 0.25f, true);
     controlChange (processor, 1, 31, 0);   // a controller never unlearns
     EXPECT_EQ (controllerOf (processor, Param::LFO1Rate), -1);
     EXPECT_EQ (processor.getParameter (Param::LFO1Rate), 0.25f);
     EXPECT_EQ (controllerOf (processor, Param::LFO2Rate), 31);
     EXPECT_EQ (processor.getParameter (Param::LFO2Rate), 0.0f);
-
     processor.getParameterRecord (5).learnArmed = true;
     processor.midiClearPending = true;
     EXPECT_EQ (controllerOf (processor, Param::LFO2Rate), 31);
@@ -94,7 +87,6 @@ TEST (Preferences, BindingsAndEditorSizeOutliveTheInstanceUnderCaseSensitiveKeys
         processor.getParameterRecord (Param::Delay1Time).midiController = 74;
         processor.setLastEditorSize (1200.0f, 600.0f);
     }
-
     std::map<juce::String, juce::String> values;
     const auto xml = juce::parseXML (preferencesFile());
     ASSERT_NE (xml, nullptr);
@@ -104,11 +96,9 @@ TEST (Preferences, BindingsAndEditorSizeOutliveTheInstanceUnderCaseSensitiveKeys
     EXPECT_EQ (values["Delay1TimeCC"] + " " + values["LFO2SyncedRateCC"], "74 -1");
     EXPECT_EQ (values["LastWidth"].getDoubleValue(), 1200.0);
     EXPECT_EQ (values["LastHeight"].getDoubleValue(), 600.0);
-
     VeltraneAudioProcessor next;
     EXPECT_EQ (controllerOf (next, Param::Delay1Time), 74);
     EXPECT_EQ (next.lastEditorWidth, 1200.0f);
-
     // Keys differ by case; a value that is no number reads as 0.
     preferencesFile().replaceWithText ("<?xml version=\"1.0\"?><PROPERTIES><VALUE name=\"lastwidth\" val=\"800\"/>"
                                        "<VALUE name=\"LastHeight\" val=\"tall\"/><VALUE name=\"delay1timecc\" val=\"5\"/></PROPERTIES>");

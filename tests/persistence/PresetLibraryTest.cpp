@@ -10,20 +10,17 @@ using namespace veltrane;
 namespace
 {
 juce::File presetFolder() { return juce::File::getSpecialLocation (juce::File::userHomeDirectory).getChildFile (".Tarnwell_Audio/Presets/Veltrane"); }
-
 void writePreset (const juce::String& fileName, const juce::String& text)
 {
     presetFolder().createDirectory();
     ASSERT_TRUE (presetFolder().getChildFile (fileName).replaceWithText (text));
 }
-
 juce::MemoryBlock stateOf (VeltraneAudioProcessor& processor)
 {
     juce::MemoryBlock block;
     processor.getStateInformation (block);
     return block;
 }
-
 // The relative paths of every file below the folder.
 juce::StringArray filesUnder (const juce::File& folder)
 {
@@ -41,12 +38,10 @@ TEST (PresetLibrary, SavedPresetHasJucesLayoutAndComesBackWithItsNameButNoBindin
     VeltraneAudioProcessor processor;
     EXPECT_TRUE (processor.getPresetNames().isEmpty());
     EXPECT_EQ (processor.getPresetName(), "Init");
-
     processor.presetListChanged = false;
     processor.savePreset();
     EXPECT_EQ (processor.getPresetNames(), juce::StringArray ("Init"));
     EXPECT_TRUE (processor.presetListChanged.load());
-
     const auto lines = juce::StringArray::fromLines (presetFolder().getChildFile ("Init.vtp").loadFileAsString());
     ASSERT_GE (lines.size(), 6);
     EXPECT_EQ (lines[0], "<?xml version=\"1.0\" encoding=\"UTF-8\"?>");
@@ -54,7 +49,6 @@ TEST (PresetLibrary, SavedPresetHasJucesLayoutAndComesBackWithItsNameButNoBindin
     EXPECT_EQ (lines[3], "<VELTRANE_PRESET PresetName=\"Init\" Delay1Time=\"0.243987232\" Delay1Feedback=\"0.400000006\"");
     EXPECT_TRUE (lines[4].startsWith (juce::String::repeatedString (" ", 17) + "Delay1TimeMod=\"0\" ")) << lines[4];
     EXPECT_FALSE (lines.joinIntoString ("").contains ("CC="));
-
     processor.setParameter (Param::MixMode, 1.0f);
     processor.setPresetName ("Wide & \"open\"");
     processor.savePreset();
@@ -78,7 +72,6 @@ TEST (PresetLibrary, MissingAttributesKeepTheirValuesAndUnusableFilesChangeNothi
     writePreset ("Entities.vtp", "<!DOCTYPE VELTRANE_PRESET [<!ENTITY e SYSTEM \"/etc/passwd\">]><VELTRANE_PRESET PresetName=\"&e;\"/>");
     presetFolder().getChildFile ("Zero.vtp").createSymbolicLink (juce::File ("/dev/zero"), true);
     ASSERT_EQ (::mkfifo (presetFolder().getChildFile ("Pipe.vtp").getFullPathName().toRawUTF8(), 0600), 0);
-
     VeltraneAudioProcessor processor;
     processor.setParameter (0, 0.6f);
     const auto before = stateOf (processor);
@@ -87,7 +80,6 @@ TEST (PresetLibrary, MissingAttributesKeepTheirValuesAndUnusableFilesChangeNothi
         processor.loadPreset (presetFolder().getChildFile (juce::String (name) + ".vtp").getFullPathName());
         EXPECT_EQ (stateOf (processor), before) << name;
     }
-
     processor.loadPreset (presetFolder().getChildFile ("Sparse.vtp").getFullPathName());
     EXPECT_EQ (processor.getParameter (0), 0.6f);
     EXPECT_EQ (processor.getParameter (1), 0.25f);
@@ -103,10 +95,8 @@ TEST (PresetLibrary, ListsTheExtensionOnlyAndProgramChangesPickByIndexUpToTheLas
     presetFolder().getChildFile ("d.vtp").createDirectory();
     presetFolder().getChildFile ("e").createDirectory();
     presetFolder().getChildFile ("e/f.vtp").replaceWithText ("<VELTRANE_PRESET/>");
-
     VeltraneAudioProcessor processor;
     EXPECT_EQ (processor.getPresetNames(), juce::StringArray ("Only"));
-
     // Index 1 is one past the end: the last preset. A negative index names no file.
     for (auto [index, name] : { std::pair (1, "Only"), { -1, "Init" } })
     {
@@ -128,7 +118,6 @@ TEST (PresetLibrary, UnsafeNamesAndFailedWritesWriteNothingAndLoseNothing)
     VeltraneAudioProcessor processor;
     processor.savePreset();
     const auto before = filesUnder (homeFolder);
-
     for (const auto& name : { juce::String ("../Escaped"), juce::String ("sub/Name"), juce::String ("..\\Escaped"),
                               juce::String ("/Absolute"), juce::String::repeatedString ("n", 300) })
     {
@@ -139,7 +128,6 @@ TEST (PresetLibrary, UnsafeNamesAndFailedWritesWriteNothingAndLoseNothing)
         EXPECT_EQ (processor.getPresetNames(), juce::StringArray ("Init")) << name;
         EXPECT_TRUE (processor.presetListChanged.load()) << name;
     }
-
     // Odd names without a separator stay inside the folder.
     processor.setPresetName ("..");
     processor.savePreset();

@@ -16,9 +16,7 @@ juce::MemoryBlock chunkOf (VeltraneAudioProcessor& processor)
     processor.getStateInformation (block);
     return block;
 }
-
 juce::String textOf (const juce::MemoryBlock& chunk) { return juce::String::fromUTF8 ((const char*) chunk.getData() + 8, (int) chunk.getSize() - 9); }
-
 // "VC2!", a length field (the text's own unless given), the text, a zero byte.
 juce::MemoryBlock wrap (const std::string& text, std::optional<int> length = {})
 {
@@ -29,9 +27,7 @@ juce::MemoryBlock wrap (const std::string& text, std::optional<int> length = {})
     out.writeByte (0);
     return out.getMemoryBlock();
 }
-
 void load (VeltraneAudioProcessor& processor, const juce::MemoryBlock& block) { processor.setStateInformation (block.getData(), (int) block.getSize()); }
-
 struct ChangeCount final : juce::AudioProcessorListener
 {
     int changes = 0;
@@ -46,7 +42,6 @@ TEST (StateChunk, FreshProcessorWritesTheDocumentedBytes)
     const auto chunk = chunkOf (processor);
     const auto* bytes = static_cast<const char*> (chunk.getData());
     const auto text = textOf (chunk);
-
     EXPECT_EQ (std::memcmp (bytes, "VC2!", 4), 0);
     EXPECT_EQ ((size_t) juce::ByteOrder::littleEndianInt (bytes + 4) + 9, chunk.getSize());
     EXPECT_EQ (bytes[chunk.getSize() - 1], 0);
@@ -62,14 +57,12 @@ TEST (StateChunk, RoundTripRestoresEveryValueBindingAndNameExactly)
     const tools::PrivateHome home;
     const float values[] { 0.0f, 1.0f, 1.17549435e-38f, 2.5e-9f, 0.1f, 0.4f, 0.99999994f, 0.50000006f, 0.333333343f, 0.123456791f };
     VeltraneAudioProcessor source, restored;
-
     for (int i = 0; i < Param::count; ++i)
     {
         source.setParameter (i, values[(size_t) i % std::size (values)]);
         source.getParameterRecord (i).midiController = i == 5 ? -1 : (i * 7) % 128;
     }
     source.setPresetName ("Tom & Jerry's \"best\" <echo>");
-
     const auto chunk = chunkOf (source);
     load (restored, chunk);
     EXPECT_EQ (chunkOf (restored), chunk);
@@ -77,7 +70,6 @@ TEST (StateChunk, RoundTripRestoresEveryValueBindingAndNameExactly)
         EXPECT_EQ (restored.getParameter (i), source.getParameter (i)) << i;
     EXPECT_EQ (restored.getParameterRecord (7).midiController.load(), 49);
     EXPECT_EQ (restored.getPresetName(), "Tom & Jerry's \"best\" <echo>");
-
     // A decimal comma in the user's locale changes nothing either way.
     struct Comma final : std::numpunct<char> { char do_decimal_point() const override { return ','; } };
     const auto previous = std::locale::global (std::locale (std::locale::classic(), new Comma));
@@ -99,7 +91,6 @@ TEST (StateChunk, MalformedBlocksChangeNothingAndTellTheHostNothing)
         manyAttributes += " a" + std::to_string (i) + "=\"1\"";
     for (int i = 0; i < 100000; ++i)
         deep += "<a>";
-
     const std::pair<const char*, juce::MemoryBlock> cases[] {
         { "empty", {} }, { "eight bytes", eightBytes }, { "wrong magic", wrongMagic }, { "length 0", wrap (valid, 0) },
         { "negative length", wrap (valid, -16) }, { "not XML", wrap ("this is not XML") },
@@ -110,7 +101,6 @@ TEST (StateChunk, MalformedBlocksChangeNothingAndTellTheHostNothing)
         { "entity expansion", wrap ("<!DOCTYPE VELTRANE_STATE [<!ENTITY a \"&a;&a;\">]><VELTRANE_STATE PresetName=\"&a;\"/>") },
         { "2000 attributes", wrap (manyAttributes + "/>") },
     };
-
     for (const auto& [what, block] : cases)
     {
         VeltraneAudioProcessor processor;
@@ -132,7 +122,6 @@ TEST (StateChunk, MissingAndOddAttributesTakeTheDocumentedDefaults)
     processor.getParameterRecord (3).midiController = 12;
     ChangeCount host;
     processor.addListener (&host);
-
     // No attributes: values stay, bindings clear, the name is one space; the host hears all 33.
     load (processor, wrap ("<VELTRANE_STATE/>"));
     EXPECT_EQ (processor.getParameter (Param::Delay1Feedback), 0.75f);
@@ -140,7 +129,6 @@ TEST (StateChunk, MissingAndOddAttributesTakeTheDocumentedDefaults)
     EXPECT_EQ (processor.getPresetName(), " ");
     EXPECT_EQ (host.changes, Param::count);
     processor.removeListener (&host);
-
     // Any case, a length beyond the data (clipped); out of range ignored, no number reads as 0.
     load (processor, wrap ("<veltrane_state presetname=\"Low\" delay1time=\"2\" DELAY1FEEDBACK=\"loud\" Delay2Time=\"0.25\""
                            " dryWetCC=\"74\"/>", 5000));

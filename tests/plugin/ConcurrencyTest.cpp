@@ -18,7 +18,6 @@ TEST (Concurrency, HostEditorAndAudioThreadsShareTheProcessor)
     std::atomic<bool> running { true };
     float peak = 0.0f;
     std::vector<juce::MemoryBlock> states;
-
     std::thread audio ([&] {
         juce::AudioBuffer<float> buffer (2, 256);
         juce::Random noise (99);
@@ -34,7 +33,6 @@ TEST (Concurrency, HostEditorAndAudioThreadsShareTheProcessor)
                 peak = std::isfinite (buffer.getSample (i / 256, i % 256)) ? std::max (peak, std::abs (buffer.getSample (i / 256, i % 256))) : INFINITY;
         }
     });
-
     std::thread host ([&] {
         juce::Random random (2026);
         const float hostile[] { NAN, INFINITY, -INFINITY, -0.5f, 1.5f, 0.0f, 1.0f };
@@ -54,7 +52,6 @@ TEST (Concurrency, HostEditorAndAudioThreadsShareTheProcessor)
             }
         }
     });
-
     std::thread editor ([&] {
         for (int round = 0; running; ++round)
         {
@@ -72,12 +69,10 @@ TEST (Concurrency, HostEditorAndAudioThreadsShareTheProcessor)
             (void) (processor.getPresetNames().joinIntoString ("") + processor.getLastParameterName() + processor.getLastParameterText() + processor.getPresetName());
         }
     });
-
     std::this_thread::sleep_for (std::chrono::milliseconds (1500));
     running = false;
     for (auto* thread : { &audio, &host, &editor })
         thread->join();
-
     EXPECT_TRUE (std::isfinite (peak));
     for (int i = 0; i < Param::count; ++i)
         EXPECT_TRUE (processor.getParameter (i) >= 0.0f && processor.getParameter (i) <= 1.0f) << processor.getParameterName (i);

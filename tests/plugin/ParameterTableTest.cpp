@@ -27,10 +27,8 @@ TEST (ParameterTable, IdentifiersLabelsAndDefaultsAsStoredFilesKnowThem)
         { "LFO2Rate", "Hz", 0.158114, "1.00 Hz" },          { "LFO2Sync", "", 0, "Off" },
         { "LFO2SyncedRate", "", 0.352941, "1/4" },
     };
-
     VeltraneAudioProcessor processor;
     ASSERT_EQ (processor.getNumParameters(), (int) std::size (rows));
-
     for (int i = 0; i < Param::count; ++i)
     {
         EXPECT_EQ (processor.getParameterName (i), rows[i].identifier);
@@ -56,7 +54,6 @@ TEST (ParameterTable, TextsFollowTheLawsChoicesLandOnTheirStepsAndOutOfRangeValu
             processor.setParameter (i, (float) k / (float) (n - 1));
             EXPECT_EQ (processor.getParameterRecord (i).choiceIndex(), k) << processor.getParameterName (i);
         }
-
     for (auto bad : { 1.5f, -0.001f, NAN, INFINITY, 1.0000001f })
     {
         processor.setParameter (Param::Delay1Feedback, 0.5f);

@@ -10,7 +10,6 @@ namespace
 float ms (float time) { return std::sqrt ((time - 1.0f) / 1999.0f); }   // square law over 1..2000 ms
 float choice (int k, int count) { return (float) k / (float) (count - 1); }
 using Settings = std::vector<std::pair<int, float>>;
-
 juce::AudioBuffer<float> filled (int channels, int length, std::function<float (int)> sample)
 {
     juce::AudioBuffer<float> audio (channels, length);
@@ -18,7 +17,6 @@ juce::AudioBuffer<float> filled (int channels, int length, std::function<float (
         audio.setSample (i / length, i % length, sample (i % length));
     return audio;
 }
-
 struct Rig
 {
     explicit Rig (const Settings& settings = {}, int channels = 2)
@@ -33,7 +31,6 @@ struct Rig
         run (silence);   // the delay times glide to their targets; then the lines are cleared
         processor.prepareToPlay (44100.0, 512);
     }
-
     // In blocks of 512; MIDI positions count from the buffer's start.
     juce::AudioBuffer<float>& run (juce::AudioBuffer<float>& audio, const juce::MidiBuffer& midi = {})
     {
@@ -46,11 +43,9 @@ struct Rig
         }
         return audio;
     }
-
     const tools::PrivateHome home;   // presets and preferences of its own
     VeltraneAudioProcessor processor;
 };
-
 int firstAbove (const juce::AudioBuffer<float>& audio, int channel, float threshold)
 {
     int i = 0;
@@ -76,7 +71,6 @@ TEST (ProcessorBlock, EveryMixModeRoutesGainsAndRepeatsTheDelays)
         { 6, 2, { { 13230, g2 } }, { { 4410, g1 } } },    // "Reverse Stereo Parallel"
         { 5, 1, { { 4410, g1 } }, {} }, { 6, 1, { { 13230, g2 } }, {} },   // mono hears the left channel's delay
     };
-
     for (const auto& c : cases)
     {
         Rig rig (c.mode < 0 ? Settings {} : Settings { { Param::MixMode, choice (c.mode, 7) }, { Param::Delay1Time, ms (100.0f) }, { Param::Delay2Time, ms (300.0f) },
@@ -121,7 +115,6 @@ TEST (ProcessorBlock, EachModulationSourceMovesTheDelayOrTheFeedback)
         EXPECT_NEAR (firstAbove (audio, 0, 0.25f), c.expected, 1.0) << "source " << c.source;
         EXPECT_NEAR (firstAbove (audio, 1, 0.25f), c.expected, 1.0) << "source " << c.source;
     }
-
     // Feedback 0.4 swung by LFO 1 at +1 to 0.8: each repeat is 0.8 * 0.96 of the last.
     auto settings = sources;
     settings.insert (settings.end(), { { Param::Delay1Time, ms (100.0f) }, { Param::Delay1FeedbackModSource, choice (5, 7) }, { Param::Delay1FeedbackMod, 1.0f } });
@@ -141,7 +134,6 @@ TEST (ProcessorBlock, RandomizeDrawsFromTheDocumentedGeneratorAndSparesItsList)
     rig.processor.setParameter (Param::Randomize, 1.0f);
     auto audio = filled (2, 64, [] (int) { return 0.0f; });
     rig.run (audio);
-
     const juce::StringArray spared { "Delay1Gain", "Delay2Gain", "DryWet", "Waveshaper", "WaveshaperAmount", "LFO1Sync", "LFO2Sync" };
     auto seed = (juce::uint64) 2024;
     for (int i = 0; i < Param::count; ++i)
@@ -167,7 +159,6 @@ TEST (ProcessorBlock, ProgramChangesAndLearnedControllersAreHeardFromTheNextBloc
             rig.processor.savePreset();
         }
         rig.processor.getParameterRecord (Param::DryWet).midiController = 7;
-
         const auto input = filled (2, 1024, [] (int i) { return 0.3f * std::sin ((float) i * 0.05f) + 0.01f; });
         auto audio = input, reference = input;
         juce::MidiBuffer midi;
@@ -192,7 +183,6 @@ TEST (ProcessorBlock, NoteOnRestartsTheLfoOnTheLeftAtItsSampleAndOnTheRightAtThe
     midi.addEvent (juce::MidiMessage::noteOn (3, 62, (juce::uint8) 90), 70);
     auto audio = filled (2, 512, [] (int) { return 0.0f; });
     rig.run (audio, midi);
-
     auto phaseAfter = [] (float phase, float step, int ticks) {
         for (int i = 0; i < ticks; ++i)
             phase = phase + step >= 1024.0f ? phase + step - 1024.0f : phase + step;
@@ -214,7 +204,6 @@ TEST (ProcessorBlock, SyncedLfosTakeTheTempoFromThePlayHead)
     } none, at90, withoutTempo;
     at90.position.emplace().setBpm (90.0);
     withoutTempo.position.emplace();
-
     // "1/4": 2 Hz at the 120 bpm assumed without a position, 1.5 Hz at 90 bpm, still at 0 bpm.
     for (auto [playHead, hz] : { std::pair<PlayHead*, float> (nullptr, 2.0f), { &none, 2.0f }, { &at90, 1.5f }, { &withoutTempo, 0.0f } })
     {

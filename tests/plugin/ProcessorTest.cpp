@@ -22,7 +22,6 @@ TEST (Processor, ControlChangeIsOneGestureAndTheHostHearsTheValueKept)
     VeltraneAudioProcessor processor;
     HostLog host;
     processor.addListener (&host);
-
     processor.setParameterFromControl (Param::DryWet, 0.25f, true);
     processor.setParameterNotifyingHost (Param::Delay1Time, 2.0f);   // refused
     EXPECT_EQ (host.calls.joinIntoString ("|"), "begin 15|set 15 0.25|end 15|set 0 " + juce::String (processor.getParameter (0)));

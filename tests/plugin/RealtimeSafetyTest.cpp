@@ -16,16 +16,24 @@ namespace
 {
 thread_local bool armed = false;
 thread_local int calls = 0;   // allocations and locks while armed
-
 void count() noexcept { calls += armed ? 1 : 0; }
 
 template <typename Function>
 Function next (const char* name) { return reinterpret_cast<Function> (dlsym (RTLD_NEXT, name)); }
-
 const auto realMutexLock = next<int (*) (pthread_mutex_t*)> ("pthread_mutex_lock");
 const auto realMutexTryLock = next<int (*) (pthread_mutex_t*)> ("pthread_mutex_trylock");
 const auto realReadLock = next<int (*) (pthread_rwlock_t*)> ("pthread_rwlock_rdlock");
 const auto realWriteLock = next<int (*) (pthread_rwlock_t*)> ("pthread_rwlock_wrlock");
+
+template <typename Fn>
+int callsDuring (Fn&& fn)
+{
+    calls = 0;
+    armed = true;
+    fn();
+    armed = false;
+    return calls;
+}
 }
 
 extern "C"
@@ -40,24 +48,10 @@ void* realloc (void* p, size_t size) { count(); return __libc_realloc (p, size);
 void* aligned_alloc (size_t alignment, size_t size) { count(); return __libc_memalign (alignment, size); }
 void* memalign (size_t alignment, size_t size) { count(); return __libc_memalign (alignment, size); }
 int posix_memalign (void** p, size_t alignment, size_t size) { count(); *p = __libc_memalign (alignment, size); return *p != nullptr ? 0 : 12; }
-
 int pthread_mutex_lock (pthread_mutex_t* m) { count(); return realMutexLock (m); }
 int pthread_mutex_trylock (pthread_mutex_t* m) { count(); return realMutexTryLock (m); }
 int pthread_rwlock_rdlock (pthread_rwlock_t* l) { count(); return realReadLock (l); }
 int pthread_rwlock_wrlock (pthread_rwlock_t* l) { count(); return realWriteLock (l); }
-}
-
-namespace
-{
-template <typename Fn>
-int callsDuring (Fn&& fn)
-{
-    calls = 0;
-    armed = true;
-    fn();
-    armed = false;
-    return calls;
-}
 }
 
 TEST (RealtimeSafety, BlocksAllocateNothingAndTakeNoLockInEveryMixModeAndShaper)

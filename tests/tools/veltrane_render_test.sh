@@ -26,16 +26,12 @@ while IFS='|' read -r expected args; do
 done <<'CASES'
 unknown argument|--frobnicate
 missing value|--rate
-bad value for --rate|--rate abc
 bad value for --block|--block 0
 unknown parameter: NoSuchThing|NoSuchThing=0.5
 bad parameter value|Delay1Time=1.5
-input file not found|--input nothing-here.wav
 cannot read audio|--input notaudio.wav
-preset file not found|--preset nothing.vtp
 not a Veltrane preset|--preset other.vtp
 cannot read state file|--state nothing.bin
-plug-in not found|--plugin /nonexistent/libVeltrane.so
 not a loadable VST2 plug-in|--plugin notaudio.wav
 cannot write|--output /nonexistent-folder/out.wav
 CASES
