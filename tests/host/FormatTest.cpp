@@ -1,5 +1,5 @@
-// The shipped VST2 binary and VST3 bundle through JUCE's hosting: identity, sound, and the state
-// chunk through each format's own state mechanism.
+// The shipped VST2 binary and VST3 bundle through JUCE's hosting: identity, sound, the state
+// chunk through each format's own state mechanism, and the MIDI that reaches the plug-in.
 
 #include "HostTestSupport.h"
 
@@ -120,6 +120,44 @@ TEST_P (Formats, ChunkRestoresEveryValueAndSavesTheSameBytes)
         ASSERT_GE (saved.getSize(), chunk.getSize());   // JUCE's VST3 wrapper may append data of its own
         EXPECT_EQ (juce::MemoryBlock (saved.getData(), chunk.getSize()), chunk);
     }
+}
+
+TEST_P (Formats, LearnedControllersProgramChangesAndNotesReachThePlugIn)
+{
+    const auto folder = juce::File::getSpecialLocation (juce::File::userHomeDirectory).getChildFile (".Tarnwell_Audio/Presets/Veltrane");
+    ASSERT_TRUE (folder.createDirectory() && folder.getChildFile ("Quiet.vtp").replaceWithText ("<VELTRANE_PRESET PresetName=\"Quiet\" WaveshaperAmount=\"0.25\"/>"));
+    std::vector<float> outputs[2];   // a note on MIDI channel 1 in block 30 for the second instance only
+    for (int instance = 0; instance < 2; ++instance)
+    {
+        plugin = loadPlugin (GetParam());   // lists the preset
+        // DryWet follows CC 74; LFO 1, a slow rising saw, swings Delay 1's time fully in "Solo 1".
+        setChunk (GetParam(), *plugin, edited (getChunk (GetParam(), *plugin), [] (juce::XmlElement& state) {
+            for (auto [id, value] : { std::pair ("DryWetCC", 74.0), { "Delay1TimeMod", 1.0 }, { "Delay1TimeModSource", 5.0 / 6.0 }, { "LFO1Wave", 0.4 },
+                                      { "LFO1Rate", 0.1 }, { "MixMode", 0.5 } })
+                state.setAttribute (id, value);
+        }));
+        juce::AudioBuffer<float> buffer (2, 512);
+        juce::Random noise (11);
+        for (int block = 0; block < 60; ++block)
+        {
+            for (int i = 0; i < 1024; ++i)
+                buffer.setSample (i / 512, i % 512, noise.nextFloat() - 0.5f);
+            juce::MidiBuffer midi;
+            if (block == 0)
+                midi.addEvent (juce::MidiMessage::controllerEvent (5, 74, 32), 100), midi.addEvent (juce::MidiMessage::programChange (1, 0), 10);
+            if (block == 30 && instance == 1)
+                midi.addEvent (juce::MidiMessage::noteOn (1, 60, (juce::uint8) 100), 100);
+            plugin->processBlock (buffer, midi);
+            outputs[instance].insert (outputs[instance].end(), buffer.getReadPointer (0), buffer.getReadPointer (0) + 512);
+        }
+        const auto state = juce::parseXML (juce::String::fromUTF8 ((const char*) getChunk (GetParam(), *plugin).getData() + 8));
+        EXPECT_FLOAT_EQ ((float) state->getDoubleAttribute ("DryWet"), 32.0f / 127.0f);
+        EXPECT_EQ (state->getStringAttribute ("PresetName") + " " + state->getStringAttribute ("WaveshaperAmount"), "Quiet 0.25");
+    }
+    // The note restarts LFO 1: the same input sounds the same up to it and differently after it.
+    const auto note = 30 * 512 + 100;
+    EXPECT_TRUE (std::equal (outputs[0].begin(), outputs[0].begin() + note, outputs[1].begin()));
+    EXPECT_FALSE (std::equal (outputs[0].begin() + note, outputs[0].end(), outputs[1].begin() + note, [] (float a, float b) { return std::abs (a - b) < 0.01f; }));
 }
 
 INSTANTIATE_TEST_SUITE_P (Vst2AndVst3, Formats, ::testing::Values (Format::vst2, Format::vst3),
