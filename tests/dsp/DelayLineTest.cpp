@@ -36,8 +36,6 @@ TEST (DelayLine, BaseDelayIsTheTimeInSamplesWithinOneSampleAndTwoSeconds)
     DelayLine line;
     for (auto [ms, samples] : { std::pair (120.0f, 5292.0f), { 2000.0f, 88200.0f }, { 2500.0f, 88200.0f }, { 0.0f, 1.0f }, { -3.0f, 1.0f }, { NAN, 88200.0f } })
         EXPECT_FLOAT_EQ (line.baseDelayFor (ms), samples) << ms << " ms";
-    line.resize (48000.0);
-    EXPECT_EQ (line.getLength(), 96000);
     line.resize (96000.0);
     EXPECT_EQ (line.getLength(), 192000);
 }

@@ -24,8 +24,7 @@ void run (Engine& engine, const EngineSettings& settings, std::vector<float>& le
 
 TEST (Engine, TimeGlidesOverAQuarterSecondAndLongBlocksDoNotSwingEverWider)
 {
-    // 500 * 1024 / 11025 ms in the first stereo block of 512; a block over 5512 samples
-    // overshoots, one over 11025 would swing ever wider.
+    // 500 * 1024 / 11025 ms in the first stereo block of 512; over 5512 samples it overshoots, over 11025 it would swing ever wider.
     for (int block : { 512, 8192, 20000 })
     {
         Engine engine (1);

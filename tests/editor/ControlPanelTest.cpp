@@ -59,11 +59,6 @@ TEST (ControlPanels, KnobsShowTheParameterAndSendOneGesturePerChangeAndDoubleCli
         EXPECT_NEAR (open.processor.getParameter (knob.parameter), home, 0.0005) << knob.slider;
         EXPECT_EQ (host.calls.size(), 3) << knob.slider;
     }
-    open.processor.setParameter (Param::Delay1TimeModSource, 0.59f);   // step 3.54: the label truncates as the engine does
-    open.processor.setParameter (Param::LFO1Wave, 1.0f);
-    tick (*open.editor);
-    EXPECT_EQ (open.in<juce::Label> ("Delay 1", "TimeModSrc Label").getText(), "Envelope 2");
-    EXPECT_EQ (open.in<juce::Label> ("Lfo1 Component", "Wave Label").getText(), "Sample & Hold");
 }
 
 TEST (ControlPanels, SyncSwitchShowsOneRateKnobAndFollowsTheHostAsTheEngineReadsIt)

@@ -1,6 +1,5 @@
-// The shipped VST2 binary driven the way demanding hosts and validators drive a plug-in: many
-// instances, absurd rates and block sizes, odd transports, MIDI of every kind, non-finite
-// input. Nothing may crash, and the output stays finite and bounded.
+// The shipped VST2 binary driven as demanding hosts and validators drive it: many instances, absurd rates and
+// block sizes, odd transports, MIDI of every kind, non-finite input. Nothing crashes; the output stays bounded.
 
 #include "HostTestSupport.h"
 

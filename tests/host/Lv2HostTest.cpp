@@ -14,7 +14,7 @@
 #include <string>
 #include <vector>
 
-TEST (Lv2Host, FoundUnderItsUriItDelaysStereoByTheDefault120Ms)
+TEST (Lv2Host, InstantiatedByLilvItDelaysStereoByTheDefault120Ms)
 {
     ::setenv ("LV2_PATH", VELTRANE_LV2_PATH, 1);
     auto* world = lilv_world_new();
@@ -23,11 +23,6 @@ TEST (Lv2Host, FoundUnderItsUriItDelaysStereoByTheDefault120Ms)
     const auto* plugin = lilv_plugins_get_by_uri (lilv_world_get_all_plugins (world), uri);
     lilv_node_free (uri);
     ASSERT_NE (plugin, nullptr) << VELTRANE_LV2_URI << " not under " << VELTRANE_LV2_PATH;
-    auto* name = lilv_plugin_get_name (plugin);
-    auto* author = lilv_plugin_get_author_name (plugin);
-    EXPECT_EQ (std::string (lilv_node_as_string (name)) + " by " + lilv_node_as_string (author), "Veltrane by Tarnwell_Audio");
-    lilv_node_free (name);
-    lilv_node_free (author);
 
     // The features every JUCE LV2 plug-in requires: URIs mapped to numbers, and block-size options.
     static std::map<std::string, LV2_URID> urids;

@@ -8,7 +8,6 @@ work="$(mktemp -d)"; trap 'rm -rf "$work"' EXIT
 export HOME="$work" LV2_PATH="$(dirname "$bundle")"
 failed=0
 check() { "${@:2}" >"$work/out.txt" 2>&1 || { failed=1; echo "FAILED: $1"; cat "$work/out.txt"; }; }
-
 for ttl in "$bundle"/*.ttl; do
     check "$(basename "$ttl") parses" serdi -q -i turtle -o ntriples "$ttl"
 done

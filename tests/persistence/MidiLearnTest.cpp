@@ -43,14 +43,6 @@ TEST (MidiLearn, TouchedControlsLearnTheNextControllerOnAnyChannelAndFollowIt)
     EXPECT_EQ (processor.getParameter (Param::Delay1Time), 64.0f / 127.0f);
     controlChange (processor, 1, 75, 0);   // no parameter follows 75
     EXPECT_EQ (processor.getParameter (Param::DryWet), 64.0f / 127.0f);
-    // Armed while learn mode is off, a parameter waits for learn mode to come back.
-    processor.setParameterFromControl (Param::LFO1Rate, 0.1f, true);
-    processor.midiLearnActive = false;
-    controlChange (processor, 1, 20, 127);
-    EXPECT_EQ (controllerOf (processor, Param::LFO1Rate), -1);
-    processor.midiLearnActive = true;
-    controlChange (processor, 1, 21, 127);
-    EXPECT_EQ (controllerOf (processor, Param::LFO1Rate), 21);
 }
 
 TEST (MidiLearn, UnlearnForgetsTouchedBindingsAndClearWaitsForTheNextBlock)

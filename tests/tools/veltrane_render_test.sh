@@ -35,5 +35,4 @@ cannot read state file|--state nothing.bin
 not a loadable VST2 plug-in|--plugin notaudio.wav
 cannot write|--output /nonexistent-folder/out.wav
 CASES
-test ! -e /nonexistent-folder/out.wav || fail "a partial output"
 exit $failed
