@@ -1,5 +1,4 @@
 #include "EditorTestSupport.h"
-#include "tests/support/TemporaryHome.h"
 
 #include <gtest/gtest.h>
 
@@ -22,8 +21,6 @@ static juce::String laidOut (const juce::Font& font, const juce::String& text, j
 // the factory preset names, the captions), tried in every label of the editor.
 TEST (CaptionFit, EveryTextShowsWholeAndOnlyTextsThatDoNotFitShrink)
 {
-    const TemporaryHome home;   // a first run, so the preset names are the factory set
-
     for (const auto size : { juce::Point<float> (1000.0f, 500.0f), juce::Point<float> (800.0f, 400.0f) })
     {
         OpenEditor open (size.x, size.y);

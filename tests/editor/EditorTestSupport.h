@@ -2,84 +2,52 @@
 
 #include "editor/VeltraneAudioProcessorEditor.h"
 #include "plugin/VeltraneAudioProcessor.h"
-
-#include <juce_gui_basics/juce_gui_basics.h>
+#include "tools/common/PrivateHome.h"
 
 namespace veltrane::test
 {
 
-// The first component below root (depth first) of type T, with the given name
-// unless the name is empty.
-template <typename T>
-T* findChild (juce::Component& root, const juce::String& name = {})
+// The first component of type T below root (depth first), with the given name unless empty.
+template <typename T = juce::Component>
+T& find (juce::Component& root, const juce::String& name = {})
 {
-    for (auto* child : root.getChildren())
-    {
-        if (auto* match = dynamic_cast<T*> (child); match != nullptr && (name.isEmpty() || child->getName() == name))
-            return match;
-
-        if (auto* deeper = findChild<T> (*child, name))
-            return deeper;
-    }
-    return nullptr;
+    std::function<T* (juce::Component&)> search = [&] (juce::Component& parent) -> T* {
+        for (auto* child : parent.getChildren())
+            if (auto* match = dynamic_cast<T*> (child); match != nullptr && (name.isEmpty() || child->getName() == name))
+                return match;
+            else if (auto* deeper = search (*child))
+                return deeper;
+        return nullptr;
+    };
+    if (auto* found = search (root))
+        return *found;
+    throw std::runtime_error (("no component " + name).toStdString());
 }
 
-// One 50 ms poll of every panel below root, as the message loop would run it.
+// One 50 ms poll of every panel, as the message loop runs it.
 inline void tick (juce::Component& root)
 {
     if (auto* timer = dynamic_cast<juce::Timer*> (&root))
         timer->timerCallback();
-
     for (auto* child : root.getChildren())
         tick (*child);
 }
 
-// A mouse event on component c at pos, pressed at downPos.
-inline juce::MouseEvent mouseEvent (juce::Component& c, juce::Point<float> pos, juce::Point<float> downPos,
-                                    int clicks = 1)
+inline juce::MouseEvent mouseAt (juce::Component& c, juce::Point<float> pos, juce::Point<float> down, int clicks = 1)
 {
     const auto now = juce::Time::getCurrentTime();
-    return juce::MouseEvent (juce::Desktop::getInstance().getMainMouseSource(), pos, {},
-                             juce::MouseInputSource::defaultPressure, 0.0f, 0.0f, 0.0f, 0.0f,
-                             &c, &c, now, downPos, now, clicks, pos != downPos);
+    return { juce::Desktop::getInstance().getMainMouseSource(), pos, {}, juce::MouseInputSource::defaultPressure, 0, 0, 0, 0, &c, &c, now, down, now, clicks, pos != down };
 }
 
-inline void doubleClick (juce::Slider& slider)
-{
-    const auto centre = slider.getLocalBounds().getCentre().toFloat();
-    slider.mouseDoubleClick (mouseEvent (slider, centre, centre, 2));
-}
-
-// A click as the mouse makes it: the listeners hear it before this returns.
-inline void click (juce::Button& button)
+// A click as the mouse makes it: the listeners have heard it when this returns.
+inline void click (juce::Component& button)
 {
     const auto centre = button.getLocalBounds().getCentre().toFloat();
-    auto& asComponent = static_cast<juce::Component&> (button);   // the handlers are protected in Button
-    asComponent.mouseDown (mouseEvent (button, centre, centre));
-    asComponent.mouseUp (mouseEvent (button, centre, centre));
+    button.mouseDown (mouseAt (button, centre, centre));
+    button.mouseUp (mouseAt (button, centre, centre));
 }
 
-// Everything the processor tells its listeners, as a host wrapper hears it.
-struct RecordingListener final : juce::AudioProcessorListener
-{
-    juce::StringArray calls;
-
-    void audioProcessorParameterChanged (juce::AudioProcessor*, int index, float value) override
-    {
-        calls.add ("set " + juce::String (index) + " " + juce::String (value, 6));
-    }
-    void audioProcessorChanged (juce::AudioProcessor*, const ChangeDetails&) override {}
-    void audioProcessorParameterChangeGestureBegin (juce::AudioProcessor*, int index) override
-    {
-        calls.add ("begin " + juce::String (index));
-    }
-    void audioProcessorParameterChangeGestureEnd (juce::AudioProcessor*, int index) override
-    {
-        calls.add ("end " + juce::String (index));
-    }
-};
-
-// A processor and its open editor, with the first poll done.
+// A processor in a home of its own and its open editor, polled once.
 struct OpenEditor
 {
     explicit OpenEditor (float width = 1000.0f, float height = 500.0f)
@@ -88,15 +56,10 @@ struct OpenEditor
         editor = std::make_unique<VeltraneAudioProcessorEditor> (processor);
         tick (*editor);
     }
-
     template <typename T = juce::Component>
-    T& child (const juce::String& name)
-    {
-        auto* found = findChild<T> (*editor, name);
-        jassert (found != nullptr);
-        return *found;
-    }
+    T& in (const juce::String& panel, const juce::String& name) { return find<T> (find (*editor, panel), name); }
 
+    const tools::PrivateHome home;
     VeltraneAudioProcessor processor;
     std::unique_ptr<VeltraneAudioProcessorEditor> editor;
 };

@@ -11,14 +11,14 @@ using namespace veltrane::test;
 TEST (PresetPoll, TypedNameSurvivesPollsBeforeItsChangeMessage)
 {
     OpenEditor open;
-    auto& box = open.child<juce::ComboBox> ("Preset Box");
+    auto& box = find<juce::ComboBox> (*open.editor, "Preset Box");
     box.addItem ("Init", 1);   // as a list refresh fills it
     box.addItem ("Slapback", 2);
     tick (*open.editor);
     ASSERT_EQ (box.getSelectedId(), 1);
 
     auto typeAndConfirm = [&] (const char* name, const char* nameFromElsewhere) {
-        auto& text = *findChild<juce::Label> (box);
+        auto& text = find<juce::Label> (box);
         text.showEditor();
         text.getCurrentTextEditor()->setText (name);
         if (nameFromElsewhere != nullptr)
