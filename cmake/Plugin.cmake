@@ -44,29 +44,8 @@ target_sources (Veltrane PRIVATE
     look/VeltraneBackground.cpp
     look/TarnwellLogo.cpp)
 
-# The factory presets, built into every format and written into a new preset folder.
-juce_add_binary_data (veltrane_factory_presets
-    HEADER_NAME FactoryPresetData.h
-    NAMESPACE FactoryPresetData
-    SOURCES
-    "${PROJECT_SOURCE_DIR}/presets/factory/Cascade.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Chorus.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Cross Echo.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Crunch Echo.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Dense Wash.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Dotted And Triplet 120.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Dotted Eighth 120.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Dub Echo.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Ducking Echo.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Eighth Triplet 120.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Flanger.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Long Ambient.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Ping Pong.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Slap Back.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Synced Sweep.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Tape Wobble.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Tempo Gate.vtp"
-    "${PROJECT_SOURCE_DIR}/presets/factory/Wide Doubler.vtp")
+include ("${PROJECT_SOURCE_DIR}/cmake/FactoryPresets.cmake")
+veltrane_add_factory_presets ("${PROJECT_SOURCE_DIR}")
 
 target_include_directories (Veltrane PUBLIC "${PROJECT_SOURCE_DIR}")
 

@@ -148,6 +148,27 @@ namespace
             return true;
         }
 
+        // Inside an element, JUCE's parser loops for ever on a processing instruction
+        // that character data follows (past spaces, comments and more instructions):
+        // it rolls back to the instruction and reads an empty text there, again and
+        // again. Such a document is refused.
+        bool markupFollows() const
+        {
+            for (const auto* q = p;;)
+            {
+                while (isSpace (*q))
+                    ++q;
+
+                const auto* end = std::strncmp (q, "<!--", 4) == 0 ? std::strstr (q + 4, "-->")
+                                : std::strncmp (q, "<?", 2) == 0   ? std::strstr (q + 2, "?>") : nullptr;
+
+                if (end == nullptr)
+                    return *q == '<';
+
+                q = end + 3 - (end[0] == '?');
+            }
+        }
+
         // Skips to the end of terminator, refusing the angle brackets that JUCE would
         // count before it.
         bool skipPastWithoutBrackets (const char* terminator)
@@ -379,10 +400,14 @@ namespace
                     skipSpace();
                     return *p++ == '>';
                 }
+                else if (startsWith ("<?"))
+                {
+                    if (! skipPast ("?>") || ! markupFollows())
+                        return false;
+                }
                 else
                 {
-                    const auto* skip = startsWith ("<!--") ? "-->" : startsWith ("<![CDATA[") ? "]]>"
-                                     : startsWith ("<?") ? "?>" : nullptr;
+                    const auto* skip = startsWith ("<!--") ? "-->" : startsWith ("<![CDATA[") ? "]]>" : nullptr;
 
                     if (skip != nullptr ? ! skipPast (skip) : ! element (depth + 1))
                         return false;

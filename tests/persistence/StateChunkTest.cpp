@@ -98,6 +98,8 @@ TEST (StateChunk, MalformedBlocksChangeNothingAndTellTheHostNothing)
         { "cut-off reference", wrap ("<VELTRANE_STATE PresetName=\"&#x41") },
         { "over 1 MiB", wrap ("<VELTRANE_STATE PresetName=\"" + std::string (1 << 20, 'x') + "\"/>") }, { "nested 100000 deep", wrap (deep) },
         { "entity expansion", wrap ("<!DOCTYPE VELTRANE_STATE [<!ENTITY a \"&a;&a;\">]><VELTRANE_STATE PresetName=\"&a;\"/>") },
+        // JUCE's parser would never return from these.
+        { "instruction before text", wrap ("<VELTRANE_STATE Delay1Time=\"0.5\"><a><?pi?> <!-- c --><?pi?>text</a></VELTRANE_STATE>") },
     };
     for (const auto& [what, block] : cases)
     {
