@@ -1,7 +1,5 @@
-// The processor's audio path written plainly from its description: one sample of one channel at a
-// time, in the precisions the description states. It includes nothing of the product (only the
-// standard library), so the engine and the shipped binary are checked against code that cannot
-// share their faults.
+// The processor's audio path written plainly from its description, one sample of one channel at a
+// time, in the precisions it states. Only the standard library: it cannot share the product's faults.
 #pragma once
 
 #include <algorithm>
@@ -104,7 +102,10 @@ struct Lfo
             frequency = 1000.0f / (60000.0f / tempo * 4.0f * bars[k.division]);
             frequency = k.division >= 5 && k.division % 2 == 1 ? (float) (frequency * 0.75) : frequency; // dotted
         }
+        // The phase wraps once per tick: a rate of a cycle per sample or more folds back; a negative or
+        // not finite one (a nonsense tempo) stands still, as 0 bpm does.
         increment = ((float) N / (float) sampleRate) * frequency;
+        increment = ! (increment >= 0.0f && std::isfinite (increment)) ? 0.0f : increment >= N ? std::fmod (increment, (float) N) : increment;
     }
 
     void restart() { phase = 0.0f, holdIndex = 0, lastIndex = N - 1; }
@@ -179,6 +180,9 @@ struct Line
     }
 };
 
+// The delays heard per mix mode and channel: bit 0 Delay 1, bit 1 Delay 2.
+inline constexpr unsigned wetOf[7][2] { { 3, 3 }, { 2, 2 }, { 1, 1 }, { 1, 1 }, { 2, 2 }, { 1, 2 }, { 2, 1 } };
+
 inline float shape (float v, int shaper, float a)
 {
     const float t = (10.0f + 390.0f * a) * v;
@@ -233,8 +237,6 @@ struct Model
                 line[c][u].baseFeedback = k.delay[u].feedback, follower[c][u].set (k.follower[u]), lfo (c, u).set (k.lfo[u], tempo);
         }
 
-        // The delays heard per mix mode and channel: bit 0 Delay 1, bit 1 Delay 2.
-        static const int wetOf[7][2] { { 3, 3 }, { 2, 2 }, { 1, 1 }, { 1, 1 }, { 2, 2 }, { 1, 2 }, { 2, 1 } };
         auto heard = [this] (int unit, float v) { return (silenced >> unit & 1) != 0 ? 0.0f : v; };
         for (int c = 0; c < numChannels; ++c)
             for (int j = 0; j < n; ++j)
@@ -257,8 +259,8 @@ struct Model
                     o2 = heard (1, line[c][1].process (x)), o1 = heard (0, line[c][0].process (o2));
                 else
                     o1 = heard (0, line[c][0].process (x)), o2 = heard (1, line[c][1].process (k.mixMode == 1 ? o1 : x));
-                const float w1 = k.delay[0].gain * o1, w2 = k.delay[1].gain * o2, heardDelays = wetOf[k.mixMode][c];
-                const float wet = heardDelays == 3 ? w1 + w2 : heardDelays == 1 ? w1 : w2;
+                const float w1 = k.delay[0].gain * o1, w2 = k.delay[1].gain * o2;
+                const float wet = wetOf[k.mixMode][c] == 3 ? w1 + w2 : wetOf[k.mixMode][c] == 1 ? w1 : w2;
                 io[c][j] = shape (wet * k.dryWet + (1.0f - k.dryWet) * x, k.shaper, k.amount);
             }
     }
