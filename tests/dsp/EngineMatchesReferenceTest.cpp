@@ -1,5 +1,4 @@
-// The optimised engine against the plain reference model, scenario by scenario, with the same seed
-// for the "Sample & Hold" tables.
+// The optimised engine against the plain reference model, with the same seed for "Sample & Hold".
 
 #include "ReferenceScenarios.h"
 
@@ -11,8 +10,7 @@ namespace
 {
 constexpr uint64_t seed = 0x5eed1234abcdull;
 
-// Driven as the processor drives it: the knobs once per block, the block split where a note
-// restarts an LFO.
+// Driven as the processor drives it: the knobs once per block, the block split where a note restarts an LFO.
 Audio engineRun (const Scenario& s)
 {
     veltrane::Engine engine (seed);
@@ -27,16 +25,11 @@ Audio engineRun (const Scenario& s)
             settings.envelope[u] = { k.follower[u].sensitivity, k.follower[u].attackMs, k.follower[u].releaseMs };
             settings.lfo[u] = { k.lfo[u].wave, k.lfo[u].rateHz, k.lfo[u].sync, k.lfo[u].division };
         }
-        settings.mixMode = k.mixMode, settings.dryWet = k.dryWet, settings.shaper = k.shaper, settings.shaperAmount = k.amount;
-        settings.tempoBpm = s.hostTempo();
+        settings.mixMode = k.mixMode, settings.dryWet = k.dryWet, settings.shaper = k.shaper, settings.shaperAmount = k.amount, settings.tempoBpm = s.hostTempo();
         if (resumed)
             engine.prepare (s.sampleRate);
-
-        bool restarted[2] { false, false };
-        for (const auto& e : events)
-            if (e.position < n && restartedLfo (e) >= 0)
-                restarted[restartedLfo (e)] = true;
-        engine.beginBlock (settings, s.channels, n, restarted);
+        auto restarts = [&] (int lfo) { return std::any_of (events.begin(), events.end(), [&] (const Midi& e) { return e.position < n && restartedLfo (e) == lfo; }); };
+        engine.beginBlock (settings, s.channels, n, { restarts (0), restarts (1) });
         int done = 0;
         for (const auto& e : events)
             if (e.position < n && restartedLfo (e) >= 0)
@@ -45,8 +38,7 @@ Audio engineRun (const Scenario& s)
     });
 }
 
-// The units the output must depend on: bits 0, 1 the delays heard (both in the chains), bits 2..5
-// the sources they read (envelope 1, 2, LFO 1, 2).
+// Bits 0, 1: the delays heard (both in the chains); bits 2..5: the sources they read (envelope 1, 2, LFO 1, 2).
 unsigned unitsHeard (const Scenario& s)
 {
     const auto k = s.knobs();

@@ -26,7 +26,6 @@ inline float physical (int index, float v)
     const float range = maximum - minimum;
     return law == straight ? minimum + range * v : law == square ? minimum + range * v * v : minimum + range * std::sqrt (v);
 }
-
 inline float amplitude (float dB) { return dB <= -100.0f ? 0.0f : std::pow (10.0f, dB * 0.05f); }
 
 // What a block reads of the parameters.
@@ -35,28 +34,19 @@ struct FollowerKnobs { float sensitivity, attackMs, releaseMs; };
 struct LfoKnobs { int wave; float rateHz; bool sync; int division; };
 struct Knobs { DelayKnobs delay[2]; FollowerKnobs follower[2]; LfoKnobs lfo[2]; int mixMode; float dryWet; int shaper; float amount; };
 
-inline Knobs knobsFrom (const float* v)
+inline Knobs knobsFrom (const float* v) // Delay 1, 2 from index 0, 7; followers from 19, 22; LFOs from 25, 29
 {
     auto p = [v] (int i) { return physical (i, v[i]); };
     auto choice = [&p] (int i) { return (int) p (i); };
-    Knobs k { {}, {}, {}, choice (14), v[15], choice (16), v[17] };
-    for (int u = 0; u < 2; ++u)
-    {
-        const int d = 7 * u, e = 19 + 3 * u, l = 25 + 4 * u;
-        k.delay[u] = { p (d), v[d + 1], v[d + 2], choice (d + 3), v[d + 4], choice (d + 5), amplitude (p (d + 6)) };
-        k.follower[u] = { amplitude (p (e)), p (e + 1), p (e + 2) };
-        k.lfo[u] = { choice (l), p (l + 1), choice (l + 2) != 0, choice (l + 3) };
-    }
-    return k;
+    auto delay = [&] (int d) { return DelayKnobs { p (d), v[d + 1], v[d + 2], choice (d + 3), v[d + 4], choice (d + 5), amplitude (p (d + 6)) }; };
+    auto follower = [&] (int e) { return FollowerKnobs { amplitude (p (e)), p (e + 1), p (e + 2) }; };
+    auto lfo = [&] (int l) { return LfoKnobs { choice (l), p (l + 1), choice (l + 2) != 0, choice (l + 3) }; };
+    return { { delay (0), delay (7) }, { follower (19), follower (22) }, { lfo (25), lfo (29) }, choice (14), v[15], choice (16), v[17] };
 }
-
-// The play head's tempo: 120 bpm without a position, 0 for a position without a tempo.
-inline float tempoOf (bool hasPosition, bool hasTempo, double bpm) { return ! hasPosition ? 120.0f : hasTempo ? (float) bpm : 0.0f; }
 
 // A note-on with velocity on MIDI channel 1 restarts LFO 1 (0), on channel 2 LFO 2 (1); else -1.
 struct Midi { int position, status, data1, data2; };
 inline int restartedLfo (const Midi& e) { return (e.status == 0x90 || e.status == 0x91) && e.data2 > 0 ? e.status - 0x90 : -1; }
-
 // juce::Random's 48-bit linear congruential generator.
 struct Random48
 {
@@ -73,7 +63,6 @@ struct Lfo
     double sampleRate = 44100.0;
     float frequency = 1.0f, phase = 0.0f, increment = 0.0f;
     int wave = 0, lastIndex = N - 1, holdIndex = 0;
-
     explicit Lfo (int64_t seed)
     {
         Random48 random { seed };
@@ -89,7 +78,6 @@ struct Lfo
             table[5][i] = random.nextFloat() * 2.0f - 1.0f;
         }
     }
-
     void set (const LfoKnobs& k, float tempo)
     {
         static const float bars[18] { 8, 4, 2, 1, 0.5f, 0.5f, 0.25f, 0.25f, 0.125f, 0.125f, 0.0625f, 0.0625f,
@@ -97,19 +85,14 @@ struct Lfo
         wave = k.wave < 6 ? k.wave : wave;
         if (! k.sync)
             frequency = k.rateHz;
-        else if (k.division >= 0 && k.division <= 17)
-        {
-            frequency = 1000.0f / (60000.0f / tempo * 4.0f * bars[k.division]);
-            frequency = k.division >= 5 && k.division % 2 == 1 ? (float) (frequency * 0.75) : frequency; // dotted
-        }
-        // The phase wraps once per tick: a rate of a cycle per sample or more folds back; a negative or
-        // not finite one (a nonsense tempo) stands still, as 0 bpm does.
+        else if (k.division >= 0 && k.division <= 17) // the dotted ones (odd from 5) at 0.75 times the plain rate
+            frequency = (float) ((double) (1000.0f / (60000.0f / tempo * 4.0f * bars[k.division])) * (k.division >= 5 && k.division % 2 == 1 ? 0.75 : 1.0));
+        // The phase wraps once per tick: a cycle per sample or more folds back; a nonsense tempo stands still.
         increment = ((float) N / (float) sampleRate) * frequency;
         increment = ! (increment >= 0.0f && std::isfinite (increment)) ? 0.0f : increment >= N ? std::fmod (increment, (float) N) : increment;
     }
 
     void restart() { phase = 0.0f, holdIndex = 0, lastIndex = N - 1; }
-
     float tick()
     {
         const int i = (int) phase;
@@ -126,13 +109,11 @@ struct Follower
 {
     double sampleRate = 44100.0;
     float attack = 0.0f, release = 0.0f, envelope = 0.0f; // coefficients and state
-
     void set (const FollowerKnobs& k) // a time of 0 gives a coefficient of 0: instant following
     {
         attack = std::exp (-1.0f / (float) (k.attackMs * 0.001 * (double) (float) sampleRate));
         release = std::exp (-1.0f / (float) (k.releaseMs * 0.001 * (double) (float) sampleRate));
     }
-
     float process (float input)
     {
         const float a = std::fabs (input), c = a > envelope ? attack : release;
@@ -146,15 +127,12 @@ struct Line
     int length = 88200, writeIndex = 0;
     std::vector<float> buffer = std::vector<float> (88200);
     float delay = 0.0f, feedback = 0.0f, baseFeedback = 0.0f; // delay in samples
-
-    void resize (double rate)
+    void prepare (double rate) // two seconds at any rate, always silent
     {
-        if (rate != sampleRate)
-            length = (int) (rate / sampleRate * length), buffer.assign ((size_t) length, 0.0f), writeIndex = 0, sampleRate = rate;
+        length = rate != sampleRate ? (int) (rate / sampleRate * length) : length, sampleRate = rate;
+        buffer.assign ((size_t) length, 0.0f), writeIndex = 0;
     }
-
-    // The base delay from the smoothed time, clamped to [1, L] (NaN gives L), then both
-    // modulations; a depth of 0 (or the source "None") leaves the base.
+    // The base delay from the smoothed time within [1, L] (NaN gives L), then both modulations (depth 0: none).
     void modulate (float timeMs, float timeDepth, float timeSource, float feedbackDepth, float feedbackSource)
     {
         const float d = (float) ((float) sampleRate * (double) timeMs * 0.001), L = (float) length, f = baseFeedback;
@@ -162,11 +140,9 @@ struct Line
         delay = timeDepth != 0.0f ? h * timeDepth * timeSource + b : b;
         feedback = feedbackDepth != 0.0f ? (f > 0.5f ? 1.0f - f : f) * feedbackDepth * feedbackSource + f : f;
     }
-
     float process (float input)
     {
-        // The delay is kept within [0, L] (NaN reads the oldest slot, as 0 and L do); a read
-        // position that rounds up to L after its wrap wraps again.
+        // Within [0, L] (NaN reads the oldest slot, as 0 and L do); a position rounding up to L wraps again.
         const float L = (float) length, d = delay > L ? L : delay >= 0.0f ? delay : 0.0f;
         float position = (float) writeIndex - d;
         position = position < 0.0f ? position + L : position;
@@ -199,21 +175,13 @@ struct Model
         for (int i = 0; i < 4; ++i)
             lfos.emplace_back (random.nextInt64());
     }
-
     Lfo& lfo (int channel, int index) { return lfos[(size_t) (2 * channel + index)]; }
-
     void prepare (double rate) // rates that are not finite or outside 1 kHz..768 kHz are ignored
     {
-        const bool change = rate >= 1000.0 && rate <= 768000.0 && rate != sampleRate;
-        sampleRate = change ? rate : sampleRate;
+        sampleRate = rate >= 1000.0 && rate <= 768000.0 ? rate : sampleRate;
         for (int c = 0; c < 2; ++c)
             for (int u = 0; u < 2; ++u)
-            {
-                if (change)
-                    line[c][u].resize (rate), follower[c][u].sampleRate = rate, lfo (c, u).sampleRate = rate;
-                std::fill (line[c][u].buffer.begin(), line[c][u].buffer.end(), 0.0f);
-                line[c][u].writeIndex = 0, follower[c][u].envelope = 0.0f;
-            }
+                line[c][u].prepare (sampleRate), follower[c][u].sampleRate = lfo (c, u).sampleRate = sampleRate, follower[c][u].envelope = 0.0f;
     }
 
     // values: the 33 normalised parameters; events at [0, n) are met during channel 0's pass.
@@ -224,9 +192,8 @@ struct Model
         const double quarter = sampleRate * 0.25, steps = (double) numChannels * n;
         for (int u = 0; u < 2; ++u)
         {
-            // A block of at least twice a quarter second's steps lands on the target rather than
-            // swinging past it. A step too small to move the time in single precision covers the
-            // rest in a straight line over the block, or, if even that is too small, snaps.
+            // A block of at least twice a quarter second's steps lands on the target rather than swinging past
+            // it; a step too small to move the time in single precision spans the block, or else snaps.
             const float distance = k.delay[u].timeMs - smoothed[u];
             step[u] = (float) (distance / (steps >= 2.0 * quarter ? steps : quarter));
             if (smoothed[u] + step[u] == smoothed[u] && distance != 0.0f)
@@ -236,7 +203,6 @@ struct Model
             for (int c = 0; c < 2; ++c)
                 line[c][u].baseFeedback = k.delay[u].feedback, follower[c][u].set (k.follower[u]), lfo (c, u).set (k.lfo[u], tempo);
         }
-
         auto heard = [this] (int unit, float v) { return (silenced >> unit & 1) != 0 ? 0.0f : v; };
         for (int c = 0; c < numChannels; ++c)
             for (int j = 0; j < n; ++j)
@@ -253,7 +219,6 @@ struct Model
                 for (int u = 0; u < 2; ++u)
                     line[c][u].modulate (smoothed[u], k.delay[u].timeSource != 0 ? k.delay[u].timeDepth : 0.0f, source[k.delay[u].timeSource],
                                          k.delay[u].feedbackSource != 0 ? k.delay[u].feedbackDepth : 0.0f, source[k.delay[u].feedbackSource]);
-
                 float o1, o2;
                 if (k.mixMode == 2)
                     o2 = heard (1, line[c][1].process (x)), o1 = heard (0, line[c][0].process (o2));

@@ -12,13 +12,11 @@ using namespace reference;
 namespace
 {
 VstTimeInfo timeInfo {};
-bool answersTime = false;
+bool answersTime = false; // a host without a play head position
 
 VstIntPtr hostCallback (AEffect*, VstInt32 opcode, VstInt32, VstIntPtr, void*, float)
 {
-    if (opcode == audioMasterGetTime)
-        return answersTime ? reinterpret_cast<VstIntPtr> (&timeInfo) : 0;
-    return opcode == audioMasterVersion ? 2400 : 0;
+    return opcode == audioMasterGetTime ? (answersTime ? reinterpret_cast<VstIntPtr> (&timeInfo) : 0) : opcode == audioMasterVersion ? 2400 : 0;
 }
 
 Audio vst2Run (const Scenario& s)
@@ -29,17 +27,12 @@ Audio vst2Run (const Scenario& s)
     auto dispatch = [effect] (VstInt32 opcode, VstIntPtr value, void* ptr = nullptr, float opt = 0.0f) { return effect->dispatcher (effect, opcode, 0, value, ptr, opt); };
 
     VstSpeakerArrangement in {}, out {};
-    in.type = out.type = s.channels == 1 ? kSpeakerArrMono : kSpeakerArrStereo;
-    in.numChannels = out.numChannels = s.channels;
-    dispatch (effOpen, 0);
-    dispatch (effSetSpeakerArrangement, reinterpret_cast<VstIntPtr> (&in), &out);
-    dispatch (effSetSampleRate, 0, nullptr, (float) s.sampleRate);
-    dispatch (effSetBlockSize, s.blockSize);
-    dispatch (effMainsChanged, 1);
+    in.type = out.type = s.channels == 1 ? kSpeakerArrMono : kSpeakerArrStereo, in.numChannels = out.numChannels = s.channels;
+    dispatch (effOpen, 0), dispatch (effSetSpeakerArrangement, reinterpret_cast<VstIntPtr> (&in), &out);
+    dispatch (effSetSampleRate, 0, nullptr, (float) s.sampleRate), dispatch (effSetBlockSize, s.blockSize), dispatch (effMainsChanged, 1);
     timeInfo = {};
     timeInfo.sampleRate = s.sampleRate, timeInfo.tempo = s.tempo.bpm, timeInfo.flags = s.tempo.hasTempo ? kVstTempoValid : 0;
     answersTime = s.tempo.hasPosition;
-
     auto audio = run (s, [&] (const float* values, float* const* io, int n, const std::vector<Midi>& events, bool resumed) {
         if (resumed)
             dispatch (effMainsChanged, 0), dispatch (effMainsChanged, 1);
@@ -57,17 +50,14 @@ Audio vst2Run (const Scenario& s)
         dispatch (effProcessEvents, 0, &list);
         effect->processReplacing (effect, const_cast<float**> (io), const_cast<float**> (io), n);
     });
-
-    dispatch (effMainsChanged, 0);
-    dispatch (effClose, 0);
-    dlclose (library);
+    dispatch (effMainsChanged, 0), dispatch (effClose, 0), dlclose (library);
     return audio;
 }
 
 std::vector<Scenario> withoutSampleAndHold()
 {
-    std::vector<Scenario> kept;
-    std::copy_if (scenarios().begin(), scenarios().end(), std::back_inserter (kept), [] (const Scenario& s) { return s.knobs().lfo[0].wave != 5 && s.knobs().lfo[1].wave != 5; });
+    auto kept = scenarios();
+    kept.erase (std::remove_if (kept.begin(), kept.end(), [] (const Scenario& s) { return s.knobs().lfo[0].wave == 5 || s.knobs().lfo[1].wave == 5; }), kept.end());
     return kept;
 }
 
