@@ -3,7 +3,7 @@
 
 #include <gtest/gtest.h>
 
-#include <map>
+#include <cstring>
 
 using namespace veltrane;
 
@@ -12,17 +12,23 @@ namespace
 // One block carrying a control change (MIDI channel, controller, value).
 void controlChange (VeltraneAudioProcessor& processor, int channel, int controller, int value)
 {
-    juce::AudioBuffer<float> buffer (2, 64);
-    buffer.clear();
-    juce::MidiBuffer midi;
-    midi.addEvent (juce::MidiMessage::controllerEvent (channel, controller, value), 10);
-    processor.processBlock (buffer, midi);
+    juce::AudioBuffer<float> silence (2, 64);
+    silence.clear();
+    juce::MidiBuffer midi (juce::MidiMessage::controllerEvent (channel, controller, value));
+    processor.processBlock (silence, midi);
 }
 int controllerOf (VeltraneAudioProcessor& processor, int index) { return processor.getParameterRecord (index).midiController.load(); }
 juce::File preferencesFile() { return juce::File::getSpecialLocation (juce::File::userHomeDirectory).getChildFile (".Tarnwell_Audio/Veltrane.prefs"); }
+juce::String valueInFile (const juce::String& key)
+{
+    const auto xml = juce::parseXML (preferencesFile());
+    auto* value = xml != nullptr ? xml->getChildByAttribute ("name", key) : nullptr;
+    return value != nullptr ? value->getStringAttribute ("val") : "(none)";
+}
+void writePreferences (const char* text) { preferencesFile().getParentDirectory().createDirectory(); preferencesFile().replaceWithData (text, std::strlen (text)); }
 }
 
-TEST (MidiLearn, TouchedControlsLearnTheNextControllerOnAnyChannelAndFollowIt)
+TEST (MidiLearn, TouchedControlsLearnOrForgetTheNextControllerAndClearWaitsForTheNextBlock)
 {
     const tools::PrivateHome home;
     VeltraneAudioProcessor processor;
@@ -31,71 +37,50 @@ TEST (MidiLearn, TouchedControlsLearnTheNextControllerOnAnyChannelAndFollowIt)
     processor.setParameterFromControl (Param::Delay1Time, 0.3f, true);
     processor.setParameterFromControl (Param::DryWet, 0.5f, true);
     processor.setParameterFromControl (Param::MixMode, 0.5f, false);      // a controller never arms
-    controlChange (processor, 5, 74, 127);
+    controlChange (processor, 5, 74, 127);                                 // on any channel
     for (auto index : { Param::Delay1Time, Param::DryWet })
-    {
-        EXPECT_EQ (controllerOf (processor, index), 74);
-        EXPECT_EQ (processor.getParameter (index), 1.0f);
-    }
+        EXPECT_EQ (std::pair (controllerOf (processor, index), processor.getParameter (index)), std::pair (74, 1.0f));
     for (auto index : { Param::Waveshaper, Param::MixMode })
         EXPECT_EQ (controllerOf (processor, index), -1);
     controlChange (processor, 16, 74, 64);
-    EXPECT_EQ (processor.getParameter (Param::Delay1Time), 64.0f / 127.0f);
     controlChange (processor, 1, 75, 0);   // no parameter follows 75
     EXPECT_EQ (processor.getParameter (Param::DryWet), 64.0f / 127.0f);
-}
-
-TEST (MidiLearn, UnlearnForgetsTouchedBindingsAndClearWaitsForTheNextBlock)
-{
-    const tools::PrivateHome home;
-    VeltraneAudioProcessor processor;
-    processor.getParameterRecord (Param::LFO1Rate).midiController = 30;
-    processor.getParameterRecord (Param::LFO2Rate).midiController = 31;
+    processor.midiLearnActive = false;
     processor.midiUnlearnActive = true;
-    processor.setParameterFromControl (Param::LFO1Rate, 0.25f, true);
-    controlChange (processor, 1, 31, 0);   // a controller never unlearns
-    EXPECT_EQ (controllerOf (processor, Param::LFO1Rate), -1);
-    EXPECT_EQ (processor.getParameter (Param::LFO1Rate), 0.25f);
-    EXPECT_EQ (controllerOf (processor, Param::LFO2Rate), 31);
-    EXPECT_EQ (processor.getParameter (Param::LFO2Rate), 0.0f);
+    processor.setParameterFromControl (Param::DryWet, 0.25f, true);
+    controlChange (processor, 1, 74, 0);   // a controller never unlearns
+    EXPECT_EQ (std::pair (controllerOf (processor, Param::DryWet), processor.getParameter (Param::DryWet)), std::pair (-1, 0.25f));
+    EXPECT_EQ (std::pair (controllerOf (processor, Param::Delay1Time), processor.getParameter (Param::Delay1Time)), std::pair (74, 0.0f));
     processor.getParameterRecord (5).learnArmed = true;
     processor.midiClearPending = true;
-    EXPECT_EQ (controllerOf (processor, Param::LFO2Rate), 31);
-    controlChange (processor, 1, 31, 127);   // cleared at the block start, before the controller
+    EXPECT_EQ (controllerOf (processor, Param::Delay1Time), 74);
+    controlChange (processor, 1, 74, 127);   // cleared at the block start, before the controller
     EXPECT_FALSE (processor.midiClearPending.load());
-    EXPECT_EQ (controllerOf (processor, Param::LFO2Rate), -1);
-    EXPECT_EQ (processor.getParameter (Param::LFO2Rate), 0.0f);
+    EXPECT_EQ (std::pair (controllerOf (processor, Param::Delay1Time), processor.getParameter (Param::Delay1Time)), std::pair (-1, 0.0f));
     EXPECT_TRUE (processor.getParameterRecord (5).learnArmed.load());
 }
 
-TEST (Preferences, BindingsAndEditorSizeOutliveTheInstanceUnderCaseSensitiveKeys)
+// An instance that closes writes only what it changed, on top of what other instances saved
+// since it opened; keys are case-sensitive, and those it does not know stay.
+TEST (Preferences, BindingsAndEditorSizeOutliveTheInstanceAndInstancesKeepEachOthersChanges)
 {
     const tools::PrivateHome home;
+    writePreferences ("<PROPERTIES><VALUE name=\"Other\" val=\"kept\"/><VALUE name=\"lastwidth\" val=\"5\"/>"
+                      "<VALUE name=\"LastHeight\" val=\"tall\"/><VALUE name=\"DryWetCC\" val=\"7\"/><VALUE name=\"delay1timecc\" val=\"5\"/></PROPERTIES>");
+    auto longLived = std::make_unique<VeltraneAudioProcessor>();
+    EXPECT_EQ (std::pair (longLived->lastEditorWidth, longLived->lastEditorHeight), std::pair (1000.0f, 0.0f));   // no number reads as 0
+    EXPECT_EQ (std::pair (controllerOf (*longLived, Param::DryWet), controllerOf (*longLived, Param::Delay1Time)), std::pair (7, -1));
     {
-        VeltraneAudioProcessor processor;
-        EXPECT_EQ (processor.lastEditorWidth, 1000.0f);
-        EXPECT_EQ (processor.lastEditorHeight, 500.0f);
-        EXPECT_EQ (controllerOf (processor, 0), -1);
-        processor.getParameterRecord (Param::Delay1Time).midiController = 74;
-        processor.setLastEditorSize (1200.0f, 600.0f);
+        VeltraneAudioProcessor shortLived;
+        shortLived.getParameterRecord (Param::Delay1Time).midiController.store (20);
+        shortLived.getParameterRecord (Param::DryWet).midiController.store (-1);
+        shortLived.setLastEditorSize (1200.0f, 600.0f);
     }
-    std::map<juce::String, juce::String> values;
-    const auto xml = juce::parseXML (preferencesFile());
-    ASSERT_NE (xml, nullptr);
-    for (auto* value : xml->getChildWithTagNameIterator ("VALUE"))
-        values[value->getStringAttribute ("name")] = value->getStringAttribute ("val");
-    EXPECT_EQ (values.size(), 35u);
-    EXPECT_EQ (values["Delay1TimeCC"] + " " + values["LFO2SyncedRateCC"], "74 -1");
-    EXPECT_EQ (values["LastWidth"].getDoubleValue(), 1200.0);
-    EXPECT_EQ (values["LastHeight"].getDoubleValue(), 600.0);
+    longLived->getParameterRecord (Param::Delay1Feedback).midiController.store (30);
+    longLived.reset();
     VeltraneAudioProcessor next;
-    EXPECT_EQ (controllerOf (next, Param::Delay1Time), 74);
-    EXPECT_EQ (next.lastEditorWidth, 1200.0f);
-    // Keys differ by case; a value that is no number reads as 0.
-    preferencesFile().replaceWithText ("<?xml version=\"1.0\"?><PROPERTIES><VALUE name=\"lastwidth\" val=\"800\"/>"
-                                       "<VALUE name=\"LastHeight\" val=\"tall\"/><VALUE name=\"delay1timecc\" val=\"5\"/></PROPERTIES>");
-    VeltraneAudioProcessor odd;
-    EXPECT_EQ (odd.lastEditorWidth, 1000.0f);
-    EXPECT_EQ (odd.lastEditorHeight, 0.0f);
-    EXPECT_EQ (controllerOf (odd, Param::Delay1Time), -1);
+    for (int i = 0; i < Param::count; ++i)
+        EXPECT_EQ (controllerOf (next, i), i == Param::Delay1Time ? 20 : i == Param::Delay1Feedback ? 30 : -1) << i;
+    EXPECT_EQ (std::pair (next.lastEditorWidth, next.lastEditorHeight), std::pair (1200.0f, 600.0f));
+    EXPECT_EQ (valueInFile ("Other") + valueInFile ("lastwidth") + " " + valueInFile ("Delay1TimeCC") + " " + valueInFile ("LastWidth"), "kept5 20 1200.0");
 }

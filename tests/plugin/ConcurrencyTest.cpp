@@ -1,7 +1,5 @@
-// Threads sharing one processor as hosts share it: the audio thread runs blocks with program
-// changes and controllers while the host automates wildly (NaN, infinities, values outside
-// [0, 1]) and saves and loads states, and the editor saves presets, arms bindings, requests
-// loads and reads the displays. Run under ThreadSanitizer by tools/run-sanitizer-checks.sh.
+// Audio, host (wild automation, states saved and loaded) and editor (presets, bindings, displays)
+// threads share one processor as hosts share it. tools/run-sanitizer-checks.sh runs it under ThreadSanitizer.
 
 #include "plugin/VeltraneAudioProcessor.h"
 
@@ -29,8 +27,8 @@ TEST (Concurrency, HostEditorAndAudioThreadsShareTheProcessor)
             for (int i = 0; i < 512; ++i)
                 buffer.setSample (i / 256, i % 256, noise.nextFloat() * 2.0f - 1.0f);
             processor.processBlock (buffer, midi);
-            for (int i = 0; i < 512; ++i)
-                peak = std::isfinite (buffer.getSample (i / 256, i % 256)) ? std::max (peak, std::abs (buffer.getSample (i / 256, i % 256))) : INFINITY;
+            for (int i = 0; i < 512; ++i)   // NaN and infinities count as infinite
+                peak = std::max (peak, std::isfinite (buffer.getSample (i / 256, i % 256)) ? std::abs (buffer.getSample (i / 256, i % 256)) : INFINITY);
         }
     });
     std::thread host ([&] {
