@@ -15,10 +15,21 @@ void dragCorner (juce::Component& editor, int dx, int dy)
     corner.mouseDrag (mouseAt (corner, end, start));
     corner.mouseUp (mouseAt (corner, end, start));
 }
-float fontOf (juce::Component& root, const char* label) { return find<juce::Label> (root, label).getFont().getHeight(); }
+// What JUCE lays out for text on one line of area: an ellipsis replaces what does not fit.
+juce::String laidOut (const juce::Font& font, const juce::String& text, juce::Rectangle<float> area)
+{
+    juce::GlyphArrangement glyphs;
+    glyphs.addFittedText (font, text, area.getX(), area.getY(), area.getWidth(), area.getHeight(),
+                          juce::Justification::centred, 1, 0.0f);
+    juce::String shown;
+    for (int i = 0; i < glyphs.getNumGlyphs(); ++i)
+        shown += juce::String::charToString (glyphs.getGlyph (i).getCharacter());
+    return shown;
+}
 }
 
-TEST (EditorLayout, ChildrenStackAndSitByTheTableAtDefaultAndSmallestSize)
+// Opened at the default size, then resized through zero (a damaged preferences file) to the smallest.
+TEST (EditorLayout, ChildrenAndCaptionFontsFollowTheSizeEvenAfterAZeroSize)
 {
     // Bottom to top: background, resize corner (unnamed), the panels in member order (MIDI unnamed).
     const struct { const char* name; juce::Rectangle<int> at1000, at800; } children[] {
@@ -29,10 +40,15 @@ TEST (EditorLayout, ChildrenStackAndSitByTheTableAtDefaultAndSmallestSize)
         { "Global Panel", { 400, 50, 200, 450 }, { 320, 40, 160, 360 } },    { "", { 0, 460, 400, 30 }, { 0, 368, 320, 24 } },
         { "Preset Component", { 600, 250, 400, 100 }, { 480, 200, 320, 80 } },
     };
+    OpenEditor open;
+    ASSERT_EQ (open.editor->getNumChildComponents(), (int) std::size (children));
     for (const auto smallest : { false, true })
     {
-        OpenEditor open (smallest ? 800.0f : 1000.0f, smallest ? 400.0f : 500.0f);
-        ASSERT_EQ (open.editor->getNumChildComponents(), (int) std::size (children));
+        if (smallest)
+        {
+            open.editor->setSize (0, 0);
+            open.editor->setSize (800, 400);
+        }
         for (int i = 0; i < (int) std::size (children); ++i)
         {
             const auto* child = open.editor->getChildComponent (i);
@@ -40,26 +56,11 @@ TEST (EditorLayout, ChildrenStackAndSitByTheTableAtDefaultAndSmallestSize)
             EXPECT_EQ (child->getBounds(), smallest ? children[i].at800 : children[i].at1000) << children[i].name;
         }
         EXPECT_EQ (find<juce::TextButton> (*open.editor, "Learn button").getBounds().getHeight(), smallest ? 10 : 12);
-    }
-}
-
-TEST (EditorLayout, CaptionFontsFollowThePanelHeightEvenAfterAZeroSize)
-{
-    for (const auto smallest : { false, true })
-    {
-        OpenEditor open;
-        if (smallest)
-        {
-            open.editor->setSize (0, 0);   // a damaged preferences file
-            open.editor->setSize (800, 400);
-        }
         const auto scale = smallest ? 0.8f : 1.0f;
-        EXPECT_NEAR (fontOf (find (*open.editor, "Delay 2"), "Time Label"), 12.0f * scale, 1e-3f);
-        EXPECT_NEAR (fontOf (find (*open.editor, "Envelope1 Component"), "Attack Label"), 10.5f * scale, 1e-3f);
-        EXPECT_NEAR (fontOf (find (*open.editor, "Lfo2 Component"), "Sync Label"), 10.5f * scale, 1e-3f);
-        EXPECT_NEAR (fontOf (find (*open.editor, "Global Panel"), "Boost Label"), 12.4f * 450.0f / 540.0f * scale, 1e-3f);
-        EXPECT_NEAR (fontOf (find (*open.editor, "Global Panel"), "Last Parameter Name"), 12.5f * scale, 1e-3f);
-        EXPECT_NEAR (fontOf (*open.editor, "Clear Label"), 9.0f * scale, 1e-3f);
+        for (auto [panel, label, size] : { std::tuple ("Delay 2", "Time Label", 12.0f), { "Envelope1 Component", "Attack Label", 10.5f },
+                                           { "Lfo2 Component", "Sync Label", 10.5f }, { "Global Panel", "Boost Label", 12.4f * 450.0f / 540.0f },
+                                           { "Global Panel", "Last Parameter Name", 12.5f }, { "", "Clear Label", 9.0f } })
+            EXPECT_NEAR (find<juce::Label> (*panel ? find (*open.editor, panel) : *open.editor, label).getFont().getHeight(), size * scale, 1e-3f) << label;
     }
 }
 
@@ -91,5 +92,59 @@ TEST (EditorLayout, StoredSizeIsTakenAsItIsUnlessNoWindowCouldHaveIt)
         dragCorner (*open.editor, 1, 1);   // the next drag brings it within the limits at the ratio 2
         EXPECT_TRUE (open.editor->getWidth() >= 800 && open.editor->getWidth() <= 2000) << c.width;
         EXPECT_EQ (open.editor->getWidth(), 2 * open.editor->getHeight()) << c.width;
+    }
+}
+
+// Every text a label can show (identifiers, every choice, both ends of every range,
+// the factory preset names, the captions), tried in every label of the editor.
+TEST (CaptionFit, EveryTextShowsWholeAndOnlyTextsThatDoNotFitShrink)
+{
+    for (const auto size : { juce::Point<float> (1000.0f, 500.0f), juce::Point<float> (800.0f, 400.0f) })
+    {
+        OpenEditor open (size.x, size.y);
+        juce::Array<juce::Label*> labels;
+        std::function<void (juce::Component&)> collect = [&] (juce::Component& c) {
+            if (auto* label = dynamic_cast<juce::Label*> (&c))
+                labels.add (label);
+            for (auto* child : c.getChildren())
+                collect (*child);
+        };
+        collect (*open.editor);
+        juce::StringArray texts (open.processor.getPresetNames());
+        for (auto* label : labels)
+            texts.add (label->getText());
+        for (int i = 0; i < Param::count; ++i)
+        {
+            const auto* choices = parameterTable[(size_t) i].choices;
+            const auto last = choices != nullptr ? choices->size - 1 : 1;
+            texts.add (open.processor.getParameterName (i));
+            for (int k = 0; k <= last; ++k)
+            {
+                open.processor.setParameter (i, (float) k / (float) last);
+                texts.add (open.processor.getParameterText (i));
+            }
+        }
+        ASSERT_GE (labels.size(), 40);   // the captions and the preset box's text
+        ASSERT_GE (texts.size(), 200);
+
+        auto& look = static_cast<juce::LookAndFeel_V2&> (open.editor->getLookAndFeel());
+        for (auto* label : labels)
+        {
+            const auto design = label->getFont();
+            const auto area = look.getLabelBorderSize (*label).subtractedFrom (label->getLocalBounds()).toFloat();
+            for (const auto& text : texts)
+            {
+                label->setText (text, juce::dontSendNotification);
+                const auto font = look.getLabelFont (*label);
+                const auto width = font.getStringWidthFloat (text.trim());
+                const auto where = label->getName() + " at " + juce::String (size.x) + ": " + text;
+                EXPECT_EQ (laidOut (font, text, area), text.trim()) << where;
+                EXPECT_LE (width, area.getWidth() + 0.01f) << where;   // whole, and not squashed either
+                if (design.getStringWidthFloat (text.trim()) <= area.getWidth())
+                    EXPECT_EQ (font.getHeight(), design.getHeight()) << where;
+                else
+                    EXPECT_GE (width, 0.99f * area.getWidth()) << where;   // no smaller than it must be
+            }
+        }
     }
 }
