@@ -115,7 +115,6 @@ TEST (GlobalPanel, BoostFollowsTheCurveRandomStaysLitUntilServedAndTheDisplayNam
     }
     auto& random = open.in<juce::TextButton> ("Global Panel", "Random Button");
     auto shown = [&] { return open.in<juce::Label> ("Global Panel", "Last Parameter Name").getText() + " " + open.in<juce::Label> ("Global Panel", "Last Parameter Value").getText(); };
-    EXPECT_EQ (shown(), " ");
     click (random);
     tick (*open.editor);   // no audio block yet
     EXPECT_TRUE (random.getToggleState());

@@ -81,9 +81,8 @@ juce::MemoryBlock getChunk (Format format, juce::AudioPluginInstance& plugin, in
         chunk.fromBase64Encoding (state->getChildElementAllSubText ("IComponent", {}));
     return chunk;
 }
-// The peak of blocks of noise at half scale (infinity for a non-finite sample), the first
-// sample replaced by poison.
-float peakOf (juce::AudioPluginInstance& plugin, int channels, int blockSize, int blocks, const juce::MidiBuffer& midi = {}, float poison = 0.0f)
+// The peak of blocks of noise at half scale (infinity for a non-finite sample).
+float peakOf (juce::AudioPluginInstance& plugin, int channels, int blockSize, int blocks, const juce::MidiBuffer& midi)
 {
     juce::AudioBuffer<float> buffer (channels, blockSize);
     juce::Random random (42);
@@ -91,7 +90,7 @@ float peakOf (juce::AudioPluginInstance& plugin, int channels, int blockSize, in
     for (int block = 0; block < blocks; ++block)
     {
         for (int i = 0; i < channels * blockSize; ++i)
-            buffer.setSample (i / blockSize, i % blockSize, i == 0 && poison != 0.0f ? poison : random.nextFloat() - 0.5f);
+            buffer.setSample (i / blockSize, i % blockSize, random.nextFloat() - 0.5f);
         auto events = midi;
         plugin.processBlock (buffer, events);
         for (int i = 0; i < channels * blockSize; ++i)
@@ -99,11 +98,21 @@ float peakOf (juce::AudioPluginInstance& plugin, int channels, int blockSize, in
     }
     return peak;
 }
+// The shipped binary of a format, opening with the preset Quiet alone in its folder (program 0).
+std::unique_ptr<juce::AudioPluginInstance> loadWithQuietAlone (Format format)
+{
+    const auto folder = juce::File::getSpecialLocation (juce::File::userHomeDirectory).getChildFile (".Tarnwell_Audio/Presets/Veltrane");
+    for (const auto& factoryPreset : folder.findChildFiles (juce::File::findFiles, false, "*.vtp"))
+        factoryPreset.deleteFile();
+    folder.createDirectory();
+    folder.getChildFile ("Quiet.vtp").replaceWithText ("<VELTRANE_PRESET PresetName=\"Quiet\" WaveshaperAmount=\"0.25\"/>");
+    return loadPlugin (format);
+}
 class Formats : public ::testing::TestWithParam<Format>
 {
 protected:
     void SetUp() override { ASSERT_NE (plugin, nullptr); }
-    std::unique_ptr<juce::AudioPluginInstance> plugin = loadPlugin (GetParam());
+    std::unique_ptr<juce::AudioPluginInstance> plugin = loadWithQuietAlone (GetParam());
 };
 }
 
@@ -133,9 +142,11 @@ TEST_P (Formats, ReportTheIdentityAndDelayByTheDefault120Ms)
     EXPECT_EQ (first, 5292);
 }
 
-TEST_P (Formats, ChunkRestoresEveryValueAndSavesTheSameBytes)
+// Every parameter at (7 i + 3) % 64 / 64 but Randomize, a controller for two in three, a name needing
+// escapes: restored through the bank and program chunks and saved as the same bytes. Then the learned
+// controller 15 (of parameter 5) and a program change (to Quiet) reach the plug-in.
+TEST_P (Formats, ChunkRestoresEveryValueAndSavesTheSameBytesAndMidiReachesThePlugIn)
 {
-    // Every parameter at (7 i + 3) % 64 / 64 but Randomize, a controller for two in three, a name needing escapes.
     const auto chunk = edited (getChunk (GetParam(), *plugin), [] (juce::XmlElement& state) {
         state.setAttribute ("PresetName", "Formats & \"Friends\"");
         for (int i = 0; i < 33; ++i)
@@ -154,34 +165,27 @@ TEST_P (Formats, ChunkRestoresEveryValueAndSavesTheSameBytes)
         ASSERT_GE (saved.getSize(), chunk.getSize());   // JUCE's VST3 wrapper may append data of its own
         EXPECT_EQ (juce::MemoryBlock (saved.getData(), chunk.getSize()), chunk);
     }
-}
-
-TEST_P (Formats, LearnedControllersAndProgramChangesReachThePlugIn)
-{
-    const auto folder = juce::File::getSpecialLocation (juce::File::userHomeDirectory).getChildFile (".Tarnwell_Audio/Presets/Veltrane");
-    for (const auto& factoryPreset : folder.findChildFiles (juce::File::findFiles, false, "*.vtp"))
-        factoryPreset.deleteFile();   // Quiet alone is program 0
-    ASSERT_TRUE (folder.createDirectory() && folder.getChildFile ("Quiet.vtp").replaceWithText ("<VELTRANE_PRESET PresetName=\"Quiet\" WaveshaperAmount=\"0.25\"/>"));
-    plugin = loadPlugin (GetParam());   // lists the preset
-    setChunk (GetParam(), *plugin, edited (getChunk (GetParam(), *plugin), [] (juce::XmlElement& state) { state.setAttribute ("DryWetCC", 74); }));
     juce::AudioBuffer<float> buffer (2, 512);
+    buffer.clear();
     for (int block = 0; block < 2; ++block)
     {
-        buffer.clear();
         juce::MidiBuffer midi;
         if (block == 0)
-            midi.addEvent (juce::MidiMessage::controllerEvent (5, 74, 32), 100), midi.addEvent (juce::MidiMessage::programChange (1, 0), 10);
+            midi.addEvent (juce::MidiMessage::controllerEvent (5, 15, 32), 100), midi.addEvent (juce::MidiMessage::programChange (1, 0), 10);
         plugin->processBlock (buffer, midi);
     }
     const auto state = juce::parseXML (textOf (getChunk (GetParam(), *plugin)));
-    EXPECT_FLOAT_EQ ((float) state->getDoubleAttribute ("DryWet"), 32.0f / 127.0f);
+    EXPECT_FLOAT_EQ ((float) state->getDoubleAttribute (state->getAttributeName (1 + 2 * 5)), 32.0f / 127.0f);
     EXPECT_EQ (state->getStringAttribute ("PresetName") + " " + state->getStringAttribute ("WaveshaperAmount"), "Quiet 0.25");
 }
 
 INSTANTIATE_TEST_SUITE_P (Vst2AndVst3, Formats, ::testing::Values (Format::vst2, Format::vst3),
                           [] (const auto& info) { return info.param == Format::vst2 ? "Vst2" : "Vst3"; });
 
-TEST (HostLifecycle, ManyInstancesAbsurdRatesBlockSizesTransportsMidiAndInput)
+// Many instances side by side, absurd rates and block sizes, MIDI of every kind on every channel:
+// nothing crashes, the output stays bounded. (Non-finite input and a tempo without position are
+// among the reference scenarios the VST2 binary is compared with sample by sample.)
+TEST (HostLifecycle, ManyInstancesAbsurdRatesBlockSizesAndMidi)
 {
     std::vector<std::unique_ptr<juce::AudioPluginInstance>> instances;
     for (int i = 0; i < 16; ++i)   // side by side, closed in another order than opened
@@ -192,6 +196,13 @@ TEST (HostLifecycle, ManyInstancesAbsurdRatesBlockSizesTransportsMidiAndInput)
     auto plugin = loadPlugin (Format::vst2);
     for (auto [index, value] : { std::pair (27, 1.0f), { 31, 1.0f }, { 2, 1.0f }, { 9, 1.0f }, { 3, 0.84f }, { 10, 1.0f }, { 1, 1.0f } })
         plugin->getParameters()[index]->setValueNotifyingHost (value);   // synced LFOs swing both delays, Delay 1 at full feedback
+    juce::MidiBuffer midi;   // every kind of message on every channel, most beyond the shortest blocks
+    const juce::uint8 sysex[] { 0x7e, 0x7f, 0x06, 0x01 };
+    for (int channel = 1; channel <= 16; ++channel)
+        for (const auto& m : { juce::MidiMessage::noteOn (channel, 60, (juce::uint8) 100), juce::MidiMessage::noteOff (channel, 60), juce::MidiMessage::pitchWheel (channel, 12000),
+                               juce::MidiMessage::controllerEvent (channel, channel * 7, 64), juce::MidiMessage::programChange (channel, channel * 8),
+                               juce::MidiMessage::channelPressureChange (channel, 90), juce::MidiMessage::midiClock(), juce::MidiMessage::createSysExMessage (sysex, 4) })
+            midi.addEvent (m, channel * 3);
     for (auto channels : { 2, 1 })
     {
         juce::AudioProcessor::BusesLayout layout;
@@ -202,37 +213,7 @@ TEST (HostLifecycle, ManyInstancesAbsurdRatesBlockSizesTransportsMidiAndInput)
             for (auto blockSize : { 1, 3, 511, 8192 })
             {
                 plugin->prepareToPlay (rate, blockSize);
-                EXPECT_LT (peakOf (*plugin, channels, blockSize, juce::jlimit (1, 32, 8192 / blockSize)), 50.0f) << rate << " Hz, " << blockSize;
+                EXPECT_LT (peakOf (*plugin, channels, blockSize, juce::jlimit (1, 32, 8192 / blockSize), midi), 50.0f) << rate << " Hz, " << blockSize;
             }
     }
-
-    struct PlayHead final : juce::AudioPlayHead
-    {
-        juce::Optional<PositionInfo> getPosition() const override
-        {
-            PositionInfo info;
-            info.setBpm (bpm > 0.0 ? juce::Optional<double> (bpm) : juce::nullopt);
-            return bpm < 0.0 ? juce::Optional<PositionInfo>() : info;
-        }
-        double bpm = 0.0;   // 0: no tempo, below 0: no position
-    } playHead;
-    plugin->setPlayHead (&playHead);
-    juce::MidiBuffer midi;   // every kind of message on every channel, and one beyond the block
-    const juce::uint8 sysex[] { 0x7e, 0x7f, 0x06, 0x01 };
-    for (int channel = 1; channel <= 16; ++channel)
-        for (const auto& m : { juce::MidiMessage::noteOn (channel, 60, (juce::uint8) 100), juce::MidiMessage::noteOff (channel, 60), juce::MidiMessage::pitchWheel (channel, 12000),
-                               juce::MidiMessage::controllerEvent (channel, channel * 7, 64), juce::MidiMessage::programChange (channel, channel * 8),
-                               juce::MidiMessage::channelPressureChange (channel, 90), juce::MidiMessage::midiClock(), juce::MidiMessage::createSysExMessage (sysex, 4) })
-            midi.addEvent (m, channel * 3);
-    midi.addEvent (juce::MidiMessage::programChange (1, 3), 100000);
-    juce::Random random (7);
-    for (auto bpm : { -1.0, 0.0, 1.0, 999.0, 120.0 })
-    {
-        playHead.bpm = bpm;
-        for (int block = 0; block < 20; ++block)
-            EXPECT_LT (peakOf (*plugin, 1, 1 + random.nextInt (4096), 1, midi), 50.0f) << bpm;
-    }
-
-    for (auto poison : { NAN, INFINITY })   // non-finite samples do not poison the lines or followers
-        EXPECT_LT (peakOf (*plugin, 1, 512, 40, {}, poison), 50.0f);
 }

@@ -1,6 +1,5 @@
-// The shipped LV2 bundle through lilv, the library most Linux LV2 hosts use: found under its URI
-// with its version, instantiated with the features it requires, and run on audio with an empty
-// event sequence.
+// The shipped LV2 bundle through lilv, the library most Linux LV2 hosts use: found under its URI,
+// instantiated with the features it requires, and run on audio with an empty event sequence.
 
 #include <lilv/lilv.h>
 #include <lv2/atom/atom.h>
@@ -25,16 +24,6 @@ TEST (Lv2Host, InstantiatedByLilvItDelaysStereoByTheDefault120Ms)
     auto* uri = lilv_new_uri (world, VELTRANE_LV2_URI);
     const auto* plugin = lilv_plugins_get_by_uri (lilv_world_get_all_plugins (world), uri);
     ASSERT_NE (plugin, nullptr) << VELTRANE_LV2_URI << " not under " << VELTRANE_LV2_PATH;
-    // Hosts compare installed copies by the manifest's minor and micro version (the URI stands for the major).
-    auto versionPart = [&] (const char* property) {
-        auto* predicate = lilv_new_uri (world, property);
-        auto* value = lilv_world_get (world, uri, predicate, nullptr);
-        const auto result = value != nullptr ? lilv_node_as_int (value) : -1;
-        lilv_node_free (value);
-        lilv_node_free (predicate);
-        return result;
-    };
-    EXPECT_EQ (versionPart (LV2_CORE__minorVersion) * 10 + versionPart (LV2_CORE__microVersion), 21);   // 1.2.1
     lilv_node_free (uri);
 
     // The features every JUCE LV2 plug-in requires: URIs mapped to numbers, and block-size options.

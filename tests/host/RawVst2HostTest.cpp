@@ -74,7 +74,7 @@ protected:
 };
 }
 
-TEST_F (RawVst2, AnswersAHostsQueriesAsDocumented)
+TEST_F (RawVst2, AnswersAHostsQueriesPinsAndArrangementsAsDocumented)
 {
     EXPECT_EQ (effect->magic, CCONST ('V', 's', 't', 'P'));
     EXPECT_EQ (effect->uniqueID, CCONST ('T', 'a', 'V', 'e'));
@@ -96,11 +96,7 @@ TEST_F (RawVst2, AnswersAHostsQueriesAsDocumented)
                                   { "receiveVstTimeInfo", 1 }, { "conformsToWindowRules", 1 }, { "bypass", 1 }, { "sendVstEvents", -1 },
                                   { "sendVstMidiEvent", -1 }, { "sendVstMidiEvents", -1 }, { "openCloseAnyThread", -1 }, { "offline", 0 }, { "", 0 } })
         EXPECT_EQ (dispatch (opCanDo, 0, 0, const_cast<char*> (query)), answer) << query;
-}
-
-// Pins: one active stereo pair of speaker pins each way; any arrangement of one or two channels taken alike.
-TEST_F (RawVst2, PinsAndSpeakerArrangements)
-{
+    // Pins: one active stereo pair of speaker pins each way; any arrangement of one or two channels taken alike.
     for (auto [opcode, bus] : { std::pair (opGetInputProperties, "Input L"), { opGetOutputProperties, "Output L" } })
     {
         EXPECT_EQ (pin (opcode, 0).flags, pinIsActive | pinUseSpeaker | pinIsStereo);

@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # The LV2 bundle as Debian's LV2 tools see it: its Turtle parses and validates against the LV2
-# specification's own bundles (never against other installed plug-ins), and lv2info shows the
-# plug-in under its absolute URI with its name and audio ports.
+# specification's own bundles (never against other installed plug-ins), the manifest carries the
+# version, and lv2info shows the plug-in under its absolute URI with its name and audio ports.
 set -uo pipefail
 bundle="$1"; uri="$2"
 work="$(mktemp -d)"; trap 'rm -rf "$work"' EXIT
@@ -19,5 +19,7 @@ check "sord_validate finds nothing unexpected" bash -c "sord_validate \$(dpkg -L
     | grep -v -E 'lv2core#Port>.*lv2core#portProperty|doap#Project>.*doap#(release|maintainer)|lv2core#(Feature|ExtensionData)>.*veltrane:UI' \
     | tee /dev/stderr | wc -l | grep -qx 0"
 check "33 parameters with subjects of their own" bash -c "test \$(grep -c '^plug:.*' '$bundle/dsp.ttl') -ge 33 && ! grep -q '^plug:_\$' '$bundle/dsp.ttl'"
+# Hosts compare installed copies by the manifest's minor and micro version (the URI stands for the major).
+check "the manifest carries 1.2.1" bash -c "serdi -i turtle -o ntriples '$bundle/manifest.ttl' | grep -F -e 'minorVersion> \"2\"' -e 'microVersion> \"1\"' | wc -l | grep -qx 2"
 check "lv2info shows name and audio ports" bash -c "lv2info '$uri' | tee '$work/info.txt' | grep -q 'Name:.*Veltrane' && grep -q 'Type:.*Audio' '$work/info.txt'"
 exit $failed
