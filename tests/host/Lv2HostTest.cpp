@@ -27,9 +27,8 @@ TEST (Lv2Host, InstantiatedByLilvItDelaysStereoByTheDefault120Ms)
     lilv_node_free (uri);
 
     // The features every JUCE LV2 plug-in requires: URIs mapped to numbers, and block-size options.
-    static std::map<std::string, LV2_URID> urids;
-    const auto id = [] (const char* u) { return urids.emplace (u, (LV2_URID) urids.size() + 1).first->second; };
-    LV2_URID_Map map { nullptr, [] (LV2_URID_Map_Handle, const char* u) { return urids.emplace (u, (LV2_URID) urids.size() + 1).first->second; } };
+    LV2_URID_Map map { nullptr, [] (LV2_URID_Map_Handle, const char* u) { static std::map<std::string, LV2_URID> ids; return ids.emplace (u, (LV2_URID) ids.size() + 1).first->second; } };
+    const auto id = [&map] (const char* u) { return map.map (nullptr, u); };
     int32_t maxBlock = 512, minBlock = 1;
     const LV2_Options_Option options[] { { LV2_OPTIONS_INSTANCE, 0, id (LV2_BUF_SIZE__maxBlockLength), 4, id (LV2_ATOM__Int), &maxBlock },
                                          { LV2_OPTIONS_INSTANCE, 0, id (LV2_BUF_SIZE__minBlockLength), 4, id (LV2_ATOM__Int), &minBlock }, {} };

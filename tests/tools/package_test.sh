@@ -7,11 +7,8 @@ build="$1"; lv2tests="$2"
 work="$(mktemp -d)"; trap 'rm -rf "$work"' EXIT
 export HOME="$work/home" XDG_CONFIG_HOME="$work/home/.config"; mkdir -p "$HOME"
 
-passed=0; failed=0
-check() { # description, command...
-    local what="$1"; shift
-    if "$@" >"$work/out.txt" 2>&1; then passed=$((passed + 1)); else failed=$((failed + 1)); echo "FAILED: $what"; cat "$work/out.txt"; fi
-}
+failed=0
+check() { "${@:2}" >"$work/out.txt" 2>&1 || { failed=1; echo "FAILED: $1"; cat "$work/out.txt"; }; }
 
 cpack --config "$build/CPackConfig.cmake" -B "$work/deb" -D CPACK_VELTRANE_COMPRESSION=gzip >"$work/cpack.txt" 2>&1 \
     || { cat "$work/cpack.txt"; exit 1; }
@@ -43,6 +40,4 @@ check "the VST3 plug-in renders" "$render" --plugin "$tree/usr/lib/vst3/Veltrane
 check "the LV2 plug-in runs in lilv" env VELTRANE_TEST_LV2_PATH="$tree/usr/lib/lv2" "$lv2tests"
 check "the application finds its libraries" bash -c "ldd '$tree/usr/bin/veltrane' && ! ldd '$tree/usr/bin/veltrane' | grep -q 'not found'"
 check "lintian reports no error" bash -c "lintian '$deb' | tee '$work/lintian.txt'; ! grep '^E:' '$work/lintian.txt'"
-
-echo "$passed passed, $failed failed"
-[ "$failed" -eq 0 ]
+exit $failed
