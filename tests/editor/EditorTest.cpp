@@ -199,7 +199,6 @@ TEST (CaptionFit, EveryTextShowsWholeAndOnlyTextsThatDoNotFitShrink)
             }
         }
         ASSERT_GE (labels.size(), 40);   // the captions and the preset box's text
-        ASSERT_GE (texts.size(), 200);
 
         auto& look = static_cast<juce::LookAndFeel_V2&> (open.editor->getLookAndFeel());
         for (auto* label : labels)
@@ -270,9 +269,8 @@ TEST (ControlPanels, SyncSwitchShowsOneRateKnobAndFollowsTheHostAsTheEngineReads
     }
 }
 
-// Boost shows one poll after the waveshaper for the curves that use it; Random stays lit until a
-// block has randomized; the display names the last change.
-TEST (GlobalPanel, BoostFollowsTheCurveRandomStaysLitUntilServedAndTheDisplayNamesTheLastChange)
+// Boost shows one poll after the waveshaper for the curves that use it.
+TEST (GlobalPanel, BoostShowsForTheCurvesThatUseItOneTickAfterTheWaveshaper)
 {
     OpenEditor open;
     auto& boost = open.in ("Global Panel", "Boost Slider");
@@ -285,19 +283,35 @@ TEST (GlobalPanel, BoostFollowsTheCurveRandomStaysLitUntilServedAndTheDisplayNam
         tick (*open.editor);
         EXPECT_EQ (boost.isVisible() && open.in ("Global Panel", "Boost Label").isVisible(), visible) << step;
     }
-    auto& random = open.in<juce::TextButton> ("Global Panel", "Random Button");
+}
+
+// Learn and Unlearn set the modes; the display names the last change; Random and Clear stay lit
+// until a block has served them (Clear clicked again while lit: off for a moment, raised again).
+TEST (Switches, LearnModesLastChangeAndRandomAndClearLitUntilABlockServesThem)
+{
+    OpenEditor open;
+    click (find (*open.editor, "Unlearn Button"));
+    EXPECT_TRUE (open.processor.midiUnlearnActive.load() && ! open.processor.midiLearnActive.load());
+    click (find (*open.editor, "Learn button"));
+    EXPECT_TRUE (open.processor.midiLearnActive.load());
+    open.in<juce::Slider> ("Envelope2 Component", "Attack Slider").setValue (0.5, juce::sendNotificationSync);
+    EXPECT_TRUE (open.processor.getParameterRecord (Param::Envelope2Attack).learnArmed.load());
     auto shown = [&] { return open.in<juce::Label> ("Global Panel", "Last Parameter Name").getText() + " " + open.in<juce::Label> ("Global Panel", "Last Parameter Value").getText(); };
-    click (random);
+    tick (*open.editor);
+    EXPECT_EQ (shown(), "Envelope2Attack 3.00 Ms");
+    auto& random = open.in<juce::TextButton> ("Global Panel", "Random Button");
+    auto& clear = find<juce::TextButton> (*open.editor, "Clear Button");
+    open.processor.getParameterRecord (Param::MixMode).midiController = 20;
+    for (auto* button : { &random, &clear, &clear })
+        click (*button);
     tick (*open.editor);   // no audio block yet
-    EXPECT_TRUE (random.getToggleState());
+    EXPECT_TRUE (random.getToggleState() && clear.getToggleState());
     EXPECT_EQ (shown(), "Randomize On");
     open.processor.serveBlockStartRequests();
     tick (*open.editor);
-    EXPECT_FALSE (random.getToggleState());
+    EXPECT_FALSE (random.getToggleState() || clear.getToggleState());
+    EXPECT_EQ (open.processor.getParameterRecord (Param::MixMode).midiController.load(), -1);
     EXPECT_NEAR (open.in<juce::Slider> ("Delay 1", "Time Slider").getValue(), open.processor.getParameter (Param::Delay1Time), 0.0005);
-    open.in<juce::Slider> ("Envelope2 Component", "Attack Slider").setValue (0.5, juce::sendNotificationSync);
-    tick (*open.editor);
-    EXPECT_EQ (shown(), "Envelope2Attack 3.00 Ms");
 }
 
 // A name typed while polls run, confirmed, then a poll before JUCE delivers the box's asynchronous
@@ -330,9 +344,7 @@ TEST (PresetPanel, TypedNamesSurviveThePollSaveListsThemAndItemKLoadsPresetKMinu
     }
     auto& save = open.in<juce::TextButton> ("Preset Component", "Save Button");
     click (save);
-    EXPECT_TRUE (open.processor.presetListChanged.load());
     tick (*open.editor);
-    EXPECT_FALSE (save.getToggleState());
     const auto names = open.processor.getPresetNames();
     ASSERT_TRUE (names.contains ("slapback") && names.size() >= 2);
     EXPECT_EQ (box.getItemText (names.indexOf ("slapback")) + " " + box.getText(), "slapback slapback");
@@ -345,25 +357,4 @@ TEST (PresetPanel, TypedNamesSurviveThePollSaveListsThemAndItemKLoadsPresetKMinu
     open.processor.setPresetName (names[0]);
     tick (*open.editor);
     EXPECT_EQ (box.getSelectedId(), 1);
-}
-
-TEST (MidiPanel, SwitchesSetTheModesAndClearStaysLitUntilTheBlockHasCleared)
-{
-    OpenEditor open;
-    click (find (*open.editor, "Unlearn Button"));
-    EXPECT_TRUE (open.processor.midiUnlearnActive.load() && ! open.processor.midiLearnActive.load());
-    click (find (*open.editor, "Learn button"));
-    EXPECT_TRUE (open.processor.midiLearnActive.load());
-    open.in<juce::Slider> ("Delay 2", "Feedback Slider").setValue (0.7, juce::sendNotificationSync);
-    EXPECT_TRUE (open.processor.getParameterRecord (Param::Delay2Feedback).learnArmed.load());
-    auto& clear = find<juce::TextButton> (*open.editor, "Clear Button");
-    open.processor.getParameterRecord (Param::MixMode).midiController = 20;
-    click (clear);
-    click (clear);   // clicked again while lit: off for a moment, the request raised again
-    tick (*open.editor);
-    EXPECT_TRUE (clear.getToggleState());
-    open.processor.serveBlockStartRequests();
-    tick (*open.editor);
-    EXPECT_FALSE (clear.getToggleState());
-    EXPECT_EQ (open.processor.getParameterRecord (Param::MixMode).midiController.load(), -1);
 }

@@ -16,20 +16,9 @@ deb="$work/deb/veltrane_1.2.1_amd64.deb"
 tree="$work/tree"
 dpkg-deb -x "$deb" "$tree" || exit 1
 
-expected="usr/bin/veltrane
-usr/bin/veltrane-render
-usr/lib/lv2/Veltrane.lv2/dsp.ttl
-usr/lib/lv2/Veltrane.lv2/libVeltrane.so
-usr/lib/lv2/Veltrane.lv2/manifest.ttl
-usr/lib/lv2/Veltrane.lv2/ui.ttl
-usr/lib/vst/Veltrane.so
-usr/lib/vst3/Veltrane.vst3/Contents/x86_64-linux/Veltrane.so
-usr/share/applications/veltrane.desktop
-usr/share/doc/veltrane/changelog.gz
-usr/share/doc/veltrane/copyright
-usr/share/icons/hicolor/256x256/apps/veltrane.png
-usr/share/man/man1/veltrane-render.1.gz
-usr/share/man/man1/veltrane.1.gz"
+expected=$(printf '%s\n' usr/bin/veltrane{,-render} usr/lib/lv2/Veltrane.lv2/{dsp.ttl,libVeltrane.so,manifest.ttl,ui.ttl} usr/lib/vst/Veltrane.so \
+    usr/lib/vst3/Veltrane.vst3/Contents/x86_64-linux/Veltrane.so usr/share/applications/veltrane.desktop usr/share/doc/veltrane/{changelog.gz,copyright} \
+    usr/share/icons/hicolor/256x256/apps/veltrane.png usr/share/man/man1/veltrane{,-render}.1.gz | LC_ALL=C sort)
 check "the file list" diff <(echo "$expected") <(cd "$tree" && find . -type f -printf '%P\n' | LC_ALL=C sort)
 check "no maintainer scripts: apt remove leaves no record behind" bash -c "! dpkg-deb -I '$deb' | grep -E 'preinst|postinst|prerm|postrm'"
 check "dependencies computed from the binaries" bash -c "dpkg-deb -f '$deb' Depends | grep -q 'libc6 (>='"
