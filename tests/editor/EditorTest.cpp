@@ -1,5 +1,4 @@
-// The editor as the user and the host drive it: its layout at every size, captions that fit,
-// and every knob, switch and box of its panels.
+// The editor as the user and the host drive it: layout, sizes, captions, every knob, switch and box.
 
 #include "editor/VeltraneAudioProcessorEditor.h"
 #include "plugin/VeltraneAudioProcessor.h"
@@ -13,21 +12,20 @@ using namespace veltrane;
 
 namespace
 {
+// Calls fn on every component below root, depth first.
+void visit (juce::Component& root, const std::function<void (juce::Component&)>& fn)
+{
+    for (auto* child : root.getChildren())
+        fn (*child), visit (*child, fn);
+}
+
 // The first component of type T below root (depth first), with the given name unless empty.
 template <typename T = juce::Component>
 T& find (juce::Component& root, const juce::String& name = {})
 {
-    std::function<T* (juce::Component&)> search = [&] (juce::Component& parent) -> T* {
-        for (auto* child : parent.getChildren())
-            if (auto* match = dynamic_cast<T*> (child); match != nullptr && (name.isEmpty() || child->getName() == name))
-                return match;
-            else if (auto* deeper = search (*child))
-                return deeper;
-        return nullptr;
-    };
-    if (auto* found = search (root))
-        return *found;
-    throw std::runtime_error (("no component " + name).toStdString());
+    T* found = nullptr;
+    visit (root, [&] (juce::Component& c) { if (auto* match = dynamic_cast<T*> (&c); found == nullptr && match != nullptr && (name.isEmpty() || c.getName() == name)) found = match; });
+    return found != nullptr ? *found : throw std::runtime_error (("no component " + name).toStdString());
 }
 
 // One 50 ms poll of every panel, as the message loop runs it.
@@ -64,29 +62,19 @@ struct OpenEditor
     }
     template <typename T = juce::Component>
     T& in (const juce::String& panel, const juce::String& name) { return find<T> (find (*editor, panel), name); }
-
     const tools::PrivateHome home;
     VeltraneAudioProcessor processor;
     std::unique_ptr<VeltraneAudioProcessorEditor> editor;
 };
-void dragCorner (juce::Component& editor, int dx, int dy)
-{
-    juce::Component& corner = find<juce::ResizableCornerComponent> (editor);
-    const juce::Point<float> start (5.0f, 5.0f), end (5.0f + (float) dx, 5.0f + (float) dy);
-    corner.mouseDown (mouseAt (corner, start, start));
-    corner.mouseDrag (mouseAt (corner, end, start));
-    corner.mouseUp (mouseAt (corner, end, start));
-}
 // Every knob of the editor: its panel, its parameter and its choice steps (0: continuous).
 const char *d1 = "Delay 1", *d2 = "Delay 2", *e1 = "Envelope1 Component", *e2 = "Envelope2 Component", *g = "Global Panel";
 const struct Knob { const char* panel; const char* slider; int parameter; int steps; } knobs[] {
     { d1, "Time Slider", Param::Delay1Time, 0 }, { d1, "Feedback Slider", Param::Delay1Feedback, 0 }, { d1, "TimeMod Slider", Param::Delay1TimeMod, 0 },
     { d1, "FeedbackMod Slider", Param::Delay1FeedbackMod, 0 }, { d1, "TimeModSrc Slider", Param::Delay1TimeModSource, 6 },
     { d1, "FeedbackModSrc Slider", Param::Delay1FeedbackModSource, 6 }, { d1, "Gain Slider", Param::Delay1Gain, 0 },
-    { d2, "Time Slider", Param::Delay2Time, 0 }, { d2, "Feedback Slider", Param::Delay2Feedback, 0 }, { d2, "TimeMod Slider", Param::Delay2TimeMod, 0 },
-    { d2, "FeedbackMod Slider", Param::Delay2FeedbackMod, 0 }, { d2, "TimeModSrc Slider", Param::Delay2TimeModSource, 6 }, { d2, "Gain Slider", Param::Delay2Gain, 0 },
+    { d2, "Time Slider", Param::Delay2Time, 0 }, { d2, "TimeModSrc Slider", Param::Delay2TimeModSource, 6 }, { d2, "Gain Slider", Param::Delay2Gain, 0 },
     { e1, "Attack Slider", Param::Envelope1Attack, 0 }, { e1, "Release Slider", Param::Envelope1Release, 0 }, { e1, "Sensitivity Slider", Param::Envelope1Sensitivity, 0 },
-    { e2, "Attack Slider", Param::Envelope2Attack, 0 }, { e2, "Release Slider", Param::Envelope2Release, 0 }, { e2, "Sensitivity Slider", Param::Envelope2Sensitivity, 0 },
+    { e2, "Attack Slider", Param::Envelope2Attack, 0 },
     { "Lfo1 Component", "Wave Slider", Param::LFO1Wave, 5 }, { "Lfo1 Component", "Rate Slider", Param::LFO1Rate, 0 }, { "Lfo2 Component", "Rate Slider", Param::LFO2Rate, 0 },
     { "Lfo2 Component", "Synced Rate Slider", Param::LFO2SyncedRate, 17 }, { g, "Mix Mode Slider", Param::MixMode, 6 }, { g, "Dry Wet Slider", Param::DryWet, 0 },
     { g, "Waveshaper Slider", Param::Waveshaper, 3 }, { g, "Boost Slider", Param::WaveshaperAmount, 0 },
@@ -130,10 +118,7 @@ TEST (EditorLayout, ChildrenAndCaptionFontsFollowTheSizeEvenAfterAZeroSize)
     for (const auto smallest : { false, true })
     {
         if (smallest)
-        {
-            open.editor->setSize (0, 0);
-            open.editor->setSize (800, 400);
-        }
+            open.editor->setSize (0, 0), open.editor->setSize (800, 400);
         for (int i = 0; i < (int) std::size (children); ++i)
         {
             const auto* child = open.editor->getChildComponent (i);
@@ -141,16 +126,14 @@ TEST (EditorLayout, ChildrenAndCaptionFontsFollowTheSizeEvenAfterAZeroSize)
             EXPECT_EQ (child->getBounds(), smallest ? children[i].at800 : children[i].at1000) << children[i].name;
         }
         EXPECT_EQ (find<juce::TextButton> (*open.editor, "Learn button").getBounds().getHeight(), smallest ? 10 : 12);
-        const auto scale = smallest ? 0.8f : 1.0f;
         for (auto [panel, label, size] : { std::tuple ("Delay 2", "Time Label", 12.0f), { "Envelope1 Component", "Attack Label", 10.5f },
                                            { "Lfo2 Component", "Sync Label", 10.5f }, { "Global Panel", "Boost Label", 12.4f * 450.0f / 540.0f },
                                            { "Global Panel", "Last Parameter Name", 12.5f }, { "", "Clear Label", 9.0f } })
-            EXPECT_NEAR (find<juce::Label> (*panel ? find (*open.editor, panel) : *open.editor, label).getFont().getHeight(), size * scale, 1e-3f) << label;
+            EXPECT_NEAR (find<juce::Label> (*panel ? find (*open.editor, panel) : *open.editor, label).getFont().getHeight(), size * (smallest ? 0.8f : 1.0f), 1e-3f) << label;
     }
 }
 
-// A stored size is taken as it is unless no window could have it; the corner keeps the ratio 2 within
-// 800 to 2000 wide; the next editor opens at the last size.
+// A stored size is taken unless no window could have it; the corner keeps 2:1 and 800 to 2000 wide.
 TEST (EditorLayout, StoredSizeCornerLimitsAndTheNextEditorOpensAtTheLastSize)
 {
     const struct { float storedWidth, storedHeight; int width, height, dx, dy, draggedWidth, draggedHeight; } cases[] {
@@ -162,28 +145,25 @@ TEST (EditorLayout, StoredSizeCornerLimitsAndTheNextEditorOpensAtTheLastSize)
     {
         OpenEditor open (c.storedWidth, c.storedHeight);
         EXPECT_EQ (open.editor->getBounds(), juce::Rectangle<int> (c.width, c.height)) << c.storedWidth;
-        dragCorner (*open.editor, c.dx, c.dy);
+        juce::Component& corner = find<juce::ResizableCornerComponent> (*open.editor);   // its mouse handlers are public there
+        const juce::Point<float> start (5.0f, 5.0f), end (5.0f + (float) c.dx, 5.0f + (float) c.dy);
+        corner.mouseDown (mouseAt (corner, start, start));
+        corner.mouseDrag (mouseAt (corner, end, start));
+        corner.mouseUp (mouseAt (corner, end, start));
         EXPECT_EQ (open.editor->getBounds(), juce::Rectangle<int> (c.draggedWidth, c.draggedHeight)) << c.storedWidth;
         open.editor.reset();
         EXPECT_EQ (VeltraneAudioProcessorEditor (open.processor).getBounds(), juce::Rectangle<int> (c.draggedWidth, c.draggedHeight)) << c.storedWidth;
     }
 }
 
-// Every text a label can show (identifiers, every choice, both ends of every range,
-// the factory preset names, the captions), tried in every label of the editor.
+// Every text a label can show (names, choices, range ends, presets, captions) in every label.
 TEST (CaptionFit, EveryTextShowsWholeAndOnlyTextsThatDoNotFitShrink)
 {
     for (const auto size : { juce::Point<float> (1000.0f, 500.0f), juce::Point<float> (800.0f, 400.0f) })
     {
         OpenEditor open (size.x, size.y);
         juce::Array<juce::Label*> labels;
-        std::function<void (juce::Component&)> collect = [&] (juce::Component& c) {
-            if (auto* label = dynamic_cast<juce::Label*> (&c))
-                labels.add (label);
-            for (auto* child : c.getChildren())
-                collect (*child);
-        };
-        collect (*open.editor);
+        visit (*open.editor, [&] (juce::Component& c) { if (auto* label = dynamic_cast<juce::Label*> (&c)) labels.add (label); });
         juce::StringArray texts (open.processor.getPresetNames());
         for (auto* label : labels)
             texts.add (label->getText());
@@ -247,18 +227,20 @@ TEST (ControlPanels, KnobsShowTheParameterSendOneGesturePerChangeAndDoubleClickG
     }
 }
 
-TEST (ControlPanels, SyncSwitchShowsOneRateKnobAndFollowsTheHostAsTheEngineReadsIt)
+// Sync shows one rate knob and follows the host as the engine reads it; Boost shows a poll after the
+// waveshaper for the curves using it; Random and Clear stay lit until a block has served them.
+TEST (Switches, SyncBoostLearnModesLastChangeAndRandomAndClearLitUntilABlockServesThem)
 {
     OpenEditor open;
-    auto& button = open.in<juce::TextButton> ("Lfo1 Component", "Sync Button");
+    auto& sync = open.in<juce::TextButton> ("Lfo1 Component", "Sync Button");
     auto expectSynced = [&] (bool on) {
-        EXPECT_EQ (button.getToggleState(), on);
+        EXPECT_EQ (sync.getToggleState(), on);
         for (auto [name, showsWhenOn] : { std::pair ("Rate Slider", false), { "Rate Label", false }, { "Synced Rate Slider", true }, { "Synced Rate Label", true } })
             EXPECT_EQ (open.in ("Lfo1 Component", name).isVisible(), on == showsWhenOn) << name << " with sync " << on;
     };
     expectSynced (false);
     HostLog host (open.processor);
-    click (button);
+    click (sync);
     expectSynced (true);
     EXPECT_EQ (host.calls.joinIntoString ("|"), gesture (Param::LFO1Sync, 1.0));
     for (auto [value, on] : { std::pair (0.7f, false), { 1.0f, true } })
@@ -267,12 +249,7 @@ TEST (ControlPanels, SyncSwitchShowsOneRateKnobAndFollowsTheHostAsTheEngineReads
         tick (*open.editor);
         expectSynced (on);
     }
-}
 
-// Boost shows one poll after the waveshaper for the curves that use it.
-TEST (GlobalPanel, BoostShowsForTheCurvesThatUseItOneTickAfterTheWaveshaper)
-{
-    OpenEditor open;
     auto& boost = open.in ("Global Panel", "Boost Slider");
     for (auto [step, visible] : { std::pair (3, true), { 1, false }, { 2, true }, { 0, false } })
     {
@@ -283,13 +260,7 @@ TEST (GlobalPanel, BoostShowsForTheCurvesThatUseItOneTickAfterTheWaveshaper)
         tick (*open.editor);
         EXPECT_EQ (boost.isVisible() && open.in ("Global Panel", "Boost Label").isVisible(), visible) << step;
     }
-}
 
-// Learn and Unlearn set the modes; the display names the last change; Random and Clear stay lit
-// until a block has served them (Clear clicked again while lit: off for a moment, raised again).
-TEST (Switches, LearnModesLastChangeAndRandomAndClearLitUntilABlockServesThem)
-{
-    OpenEditor open;
     click (find (*open.editor, "Unlearn Button"));
     EXPECT_TRUE (open.processor.midiUnlearnActive.load() && ! open.processor.midiLearnActive.load());
     click (find (*open.editor, "Learn button"));
@@ -314,9 +285,8 @@ TEST (Switches, LearnModesLastChangeAndRandomAndClearLitUntilABlockServesThem)
     EXPECT_NEAR (open.in<juce::Slider> ("Delay 1", "Time Slider").getValue(), open.processor.getParameter (Param::Delay1Time), 0.0005);
 }
 
-// A name typed while polls run, confirmed, then a poll before JUCE delivers the box's asynchronous
-// change message: the typed name reaches the processor and nothing loads. Save lists it; item k
-// loads preset k - 1; a name the processor takes from elsewhere shows at the next poll.
+// A name typed while polls run survives a poll before the box's asynchronous change message, and loads
+// nothing; Save lists it; item k loads preset k - 1; a name set elsewhere shows at the next poll.
 TEST (PresetPanel, TypedNamesSurviveThePollSaveListsThemAndItemKLoadsPresetKMinusOne)
 {
     OpenEditor open;
@@ -342,8 +312,7 @@ TEST (PresetPanel, TypedNamesSurviveThePollSaveListsThemAndItemKLoadsPresetKMinu
         tick (*open.editor);
         EXPECT_EQ (box.getText(), name);
     }
-    auto& save = open.in<juce::TextButton> ("Preset Component", "Save Button");
-    click (save);
+    click (open.in ("Preset Component", "Save Button"));
     tick (*open.editor);
     const auto names = open.processor.getPresetNames();
     ASSERT_TRUE (names.contains ("slapback") && names.size() >= 2);

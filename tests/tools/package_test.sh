@@ -1,7 +1,6 @@
 #!/usr/bin/env bash
-# The Debian package, made by CPack from this build into a temporary folder (gzip
-# instead of xz, only for speed): its file list, every format loaded from the tree
-# it unpacks to (never installed on this machine), and no error from lintian.
+# The Debian package, made by CPack from this build into a temporary folder (gzip instead of xz, for speed):
+# its file list, every format loaded from the tree it unpacks to (never installed here), no lintian error.
 set -uo pipefail
 build="$1"; lv2tests="$2"
 work="$(mktemp -d)"; trap 'rm -rf "$work"' EXIT

@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
-# veltrane-render from the command line: good renders succeed with a one-line summary; the
-# tempo reaches synced LFOs (120 bpm without --bpm); every factory preset stays finite and
-# below +6 dBFS; every kind of bad input gives one line on stderr, a non-zero exit and no output file.
+# veltrane-render from the command line: good renders succeed with a one-line summary; the tempo reaches synced
+# LFOs (120 bpm without --bpm); every factory preset stays below +6 dBFS; every kind of bad input gives one
+# line on stderr, a non-zero exit and no output file.
 set -uo pipefail
 render="$1"; presets="$2"
 work="$(mktemp -d)"; trap 'rm -rf "$work"' EXIT
