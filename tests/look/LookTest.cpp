@@ -77,7 +77,7 @@ TEST (VeltraneLook, ComboBoxShowsItsOrangeButtonAndArrowsOnlyWhenEnabled)
     }
 }
 
-TEST (Background, FramesGlowWordmarkAndLogoAt800By400)
+TEST (Background, FramesGlowAndLogoAt800By400)
 {
     VeltraneBackground background;
     const auto image = background.createComponentSnapshot ({ 800, 400 }, true, 1.0f);
