@@ -1,10 +1,11 @@
 #!/usr/bin/env bash
-# veltrane-render from the command line: good renders succeed with a one-line summary; every
-# kind of bad input gives one line on stderr, a non-zero exit and no output file.
+# veltrane-render from the command line: good renders succeed with a one-line summary; the tempo reaches synced
+# LFOs (120 bpm without --bpm); every factory preset stays below +6 dBFS; every kind of bad input gives one
+# line on stderr, a non-zero exit and no output file.
 set -uo pipefail
-render="$1"
+render="$1"; presets="$2"
 work="$(mktemp -d)"; trap 'rm -rf "$work"' EXIT
-export HOME="$work"; cd "$work"
+export HOME="$work" XDG_CONFIG_HOME="$work/.config"; cd "$work"
 failed=0
 fail() { failed=1; echo "FAILED: $*"; cat stderr.txt 2>/dev/null; }
 
@@ -15,6 +16,14 @@ printf '<VELTRANE_PRESET PresetName="Wide" MixMode="0.833333" DryWet="0.5"/>' > 
     && test -s again.wav || fail "a WAV with a preset and a parameter"
 "$render" --info 2>stderr.txt | tr '\n' '|' | grep -q "name: Veltrane|.*vendor: Tarnwell_Audio|.*parameters: 33|.*32 LFO2SyncedRate = .* (1/4)" \
     || fail "--info"
+
+synced=(--tail 0 LFO1Sync=1 Delay1TimeModSource=0.834 Delay1TimeMod=0.5 Delay1Time=0.3)
+for bpm in "" 120 90; do "$render" --output "tempo$bpm.wav" ${bpm:+--bpm $bpm} "${synced[@]}" >/dev/null; done
+cmp -s tempo.wav tempo120.wav && ! cmp -s tempo120.wav tempo90.wav || fail "the tempo"
+for preset in "$presets"/*.vtp; do
+    peak="$("$render" --rate 48000 --preset "$preset" --output preset.wav | sed -n 's/.* peak \(.*\) dBFS, rms.*/\1/p')"
+    awk -v p="$peak" 'BEGIN { exit !(p != "" && p < 6) }' || fail "$(basename "$preset") peaks at $peak dBFS"
+done
 
 echo "not audio" > notaudio.wav; echo "<OTHER/>" > other.vtp
 while IFS='|' read -r expected args; do
