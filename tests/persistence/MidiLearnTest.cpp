@@ -84,3 +84,15 @@ TEST (Preferences, BindingsAndEditorSizeOutliveTheInstanceAndInstancesKeepEachOt
     EXPECT_EQ (std::pair (next.lastEditorWidth, next.lastEditorHeight), std::pair (1200.0f, 600.0f));
     EXPECT_EQ (valueInFile ("Other") + valueInFile ("lastwidth") + " " + valueInFile ("Delay1TimeCC") + " " + valueInFile ("LastWidth"), "kept5 20 1200.0");
 }
+
+// A cut, foreign or undecodable preferences file is replaced whole by the next save, losing nothing it could hold.
+TEST (Preferences, UnreadableFilesAreReplacedWhole)
+{
+    for (const auto* text : { "<PROPERTIES><VALUE name=\"DryWetCC\" val=\"7\"/>", "<OTHER/>", "\xff\xfe<" })
+    {
+        const tools::PrivateHome home;
+        writePreferences (text);
+        std::make_unique<VeltraneAudioProcessor>()->getParameterRecord (Param::Delay1Time).midiController.store (74);
+        EXPECT_EQ (valueInFile ("Delay1TimeCC") + valueInFile ("DryWetCC"), "74-1") << text;
+    }
+}

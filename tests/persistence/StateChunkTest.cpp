@@ -127,9 +127,12 @@ TEST (StateChunk, MissingAndOddAttributesTakeTheDocumentedDefaults)
     EXPECT_EQ (std::tuple (processor.getParameter (Param::Delay1Feedback), processor.getParameterRecord (3).midiController.load(), processor.getPresetName(), host.changes),
                std::tuple (0.75f, -1, juce::String (" "), (int) Param::count));
     processor.removeListener (&host);
-    // Any case, a length beyond the data (clipped); out of range ignored, no number reads as 0.
-    load (processor, wrap ("<veltrane_state presetname=\"Low\" delay1time=\"2\" DELAY1FEEDBACK=\"loud\" Delay2Time=\"0.25\""
-                           " dryWetCC=\"74\"/>", 5000));
+    // Any case, a length beyond the data (clipped); out of range ignored, no number reads as 0, unknown attributes ignored.
+    std::string unknown;
+    for (int i = 0; i < 3000; ++i)
+        unknown += " Other" + std::to_string (i) + "=\"1\"";
+    const auto text = "<veltrane_state presetname=\"Low\" delay1time=\"2\" DELAY1FEEDBACK=\"loud\" Delay2Time=\"0.25\"" + unknown + " dryWetCC=\"74\"/>";
+    load (processor, wrap (text, (int) text.size() + 5000));
     EXPECT_EQ (std::tuple (processor.getParameter (Param::Delay1Time), processor.getParameter (Param::Delay1Feedback), processor.getParameter (Param::Delay2Time)),
                std::tuple (0.243987232f, 0.0f, 0.25f));
     EXPECT_EQ (processor.getParameterRecord (Param::DryWet).midiController.load(), 74);
