@@ -177,7 +177,8 @@ TEST (PresetLibrary, PresetsInEveryEncodingJuceReadsLoadAndDeclaredEntitiesStayR
     auto bytes = [] (const char* prefix, const juce::String& text) { juce::MemoryBlock b (prefix, std::strlen (prefix)); b.append (text.toRawUTF8(), text.getNumBytesAsUTF8()); return b; };
     // Byte-order mark and text as JUCE encodes UTF-16 (surrogate pairs included).
     auto utf16 = [] (const juce::String& text, bool bigEndian) {
-        const auto units = (juce::String::charToString (0xfeff) + text).toUTF16();
+        const auto marked = juce::String::charToString (0xfeff) + text;   // toUTF16() points into this string
+        const auto units = marked.toUTF16();
         juce::MemoryBlock b (units.getAddress(), units.sizeInBytes() - 2);
         for (size_t i = 0; bigEndian && i < b.getSize(); i += 2)
             std::swap (b[i], b[i + 1]);
