@@ -1,7 +1,7 @@
 # Run after JUCE's LV2 helper has written the bundle's manifest:
 #   cmake -DMANIFEST=<bundle>/manifest.ttl -DURI=<plug-in URI> -DVERSION=<major.minor.micro> -P Lv2ManifestVersion.cmake
 # LV2 hosts compare installed copies of a plug-in by the lv2:minorVersion and
-# lv2:microVersion in each bundle's manifest, where the LV2 specification requires
+# lv2:microVersion in each bundle's manifest, where hosts look for
 # them; JUCE 7 writes them into dsp.ttl only. LV2 has no major version: the URI
 # stands for it.
 file (READ "${MANIFEST}" manifest)

@@ -154,19 +154,8 @@ namespace
         // again. Such a document is refused.
         bool markupFollows() const
         {
-            for (const auto* q = p;;)
-            {
-                while (isSpace (*q))
-                    ++q;
-
-                const auto* end = std::strncmp (q, "<!--", 4) == 0 ? std::strstr (q + 4, "-->")
-                                : std::strncmp (q, "<?", 2) == 0   ? std::strstr (q + 2, "?>") : nullptr;
-
-                if (end == nullptr)
-                    return *q == '<';
-
-                q = end + 3 - (end[0] == '?');
-            }
+            auto ahead = *this;
+            return ahead.misc() && *ahead.p == '<';
         }
 
         // Skips to the end of terminator, refusing the angle brackets that JUCE would

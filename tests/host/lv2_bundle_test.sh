@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# The LV2 bundle as Debian's LV2 tools see it: its Turtle parses and validates against the LV2 specification's
+# The LV2 bundle as Debian's LV2 tools see it: its Turtle parses and validates against the LV2 standard's
 # own bundles (never other installed plug-ins); the manifest's version; lv2info finds it under its URI.
 set -uo pipefail
 bundle="$1"; uri="$2"
